@@ -1,0 +1,122 @@
+// orb: the design environment host. Loads the plug-ins, holds the current
+// project and the settings, opens files through the plug-ins' file editors.
+
+#include "MainWindow.h"
+#include "OpenContext.h"
+#include "Orb.h"
+#include "PluginManager.h"
+
+#include "host/gui/ApplicationBase.h"
+
+#include <QDir>
+#include <QEventLoopLocker>
+#include <QFileInfo>
+#include <QTimer>
+
+#include <cstdio>
+#include <cstring>
+
+namespace {
+
+const char usage[] =
+    "Usage: orb [options] [command]\n"
+    "\n"
+    "The Orb design environment. Without a command it opens the main window\n"
+    "(File > Open..., Edit > Preferences...).\n"
+    "\n"
+    "Commands:\n"
+    "  open FILE            Open FILE with the file editor that claims it best (the\n"
+    "                       editors of the loaded plug-ins are asked for their\n"
+    "                       suitability). orb then runs until the editor's work is\n"
+    "                       over (its windows closed, its child processes done) and\n"
+    "                       exits 0. A file that no editor claims: exit status 1.\n"
+    "\n"
+    "Options:\n"
+    "  --design NAME        With open: pass an open context naming the design,\n"
+    "                       \"<project name>|NAME\" (the project name is the current\n"
+    "                       project's, else the name of the file's directory).\n"
+    "  -h, --help           Show this text.\n"
+    "\n"
+    "Environment:\n"
+    "  VANTOR               Installation roots searched before orb's own\n"
+    "                       (colon-separated): data files, component libraries.\n"
+    "  ORB_PLUGIN_PATH      Plug-in directories searched before\n"
+    "                       <installation>/lib/orb/plugins (colon-separated).\n"
+    "  ORB_DEBUG            When set (not 0), host debug diagnostics go to\n"
+    "                       standard error.\n"
+    "\n"
+    "Settings are kept in $XDG_CONFIG_HOME/orb/orb.ini (~/.config/orb/orb.ini).\n";
+
+int fail(const char *message, const QString &argument = QString())
+{
+    std::fprintf(stderr, "orb: %s%s\n", message, qUtf8Printable(argument));
+    return 1;
+}
+
+} // namespace
+
+int main(int argc, char **argv)
+{
+    QString command;
+    QString file;
+    QString design;
+    bool haveDesign = false;
+    for (int i = 1; i < argc; ++i) {
+        const char *arg = argv[i];
+        if (!std::strcmp(arg, "-h") || !std::strcmp(arg, "--help")) {
+            std::fputs(usage, stdout);
+            return 0;
+        }
+        if (!std::strcmp(arg, "--design")) {
+            if (++i >= argc)
+                return fail("--design needs a design name");
+            design = QString::fromLocal8Bit(argv[i]);
+            haveDesign = true;
+        } else if (command.isEmpty() && !std::strcmp(arg, "open")) {
+            command = QStringLiteral("open");
+        } else if (command == QLatin1String("open") && file.isEmpty() && arg[0] != '-') {
+            file = QString::fromLocal8Bit(arg);
+        } else {
+            std::fputs(usage, stderr);
+            return fail("unknown argument: ", QString::fromLocal8Bit(arg));
+        }
+    }
+    if (command == QLatin1String("open") && file.isEmpty())
+        return fail("open needs a file name");
+
+    Gui::Clip::ApplicationBase app(argc, argv);
+    app.setApplicationName(QStringLiteral("orb"));
+    app.setOrganizationName(QStringLiteral("Vantor"));
+
+    PluginManager plugins;
+    plugins.loadAll();
+    QObject::connect(&app, &QCoreApplication::aboutToQuit, [&plugins] { plugins.unloadAll(); });
+
+    if (command.isEmpty()) {
+        MainWindow window;
+        window.show();
+        return app.exec();
+    }
+
+    const QString absolute = QFileInfo(file).absoluteFilePath();
+    QString projectName = Orb::currentProjectName();
+    if (projectName.isEmpty())
+        projectName = QFileInfo(absolute).absoluteDir().dirName();
+    OpenContext *context = haveDesign ? new OpenContext(projectName, design) : nullptr;
+
+    // The editor keeps the application alive with windows or QEventLoopLockers
+    // for as long as its work goes on; ours only covers the open request.
+    auto *locker = new QEventLoopLocker;
+    const bool opened =
+        Orb::openFile(absolute, context ? static_cast<GuiI::IOpenContext *>(context) : nullptr);
+    if (context)
+        context->Release();
+    if (!opened) {
+        delete locker;
+        plugins.unloadAll();
+        return fail("no editor can open ", file);
+    }
+    QTimer::singleShot(0, &app, [locker] { delete locker; });
+    const int status = app.exec();
+    return status;
+}

@@ -1,0 +1,124 @@
+#include "Dialog.h"
+
+#include "host/Settings.h"
+
+#include <QAbstractButton>
+#include <QDesktopServices>
+#include <QGuiApplication>
+#include <QMessageBox>
+#include <QUrl>
+#include <QVBoxLayout>
+
+#include <cstdio>
+
+namespace Gui {
+namespace Clip {
+
+Dialog::Dialog(QWidget *parent, Settings *, const char *name, bool modal, Qt::WindowFlags flags)
+    : QDialog(parent, flags)
+{
+    if (name)
+        setObjectName(QString::fromLatin1(name));
+    setModal(modal);
+}
+
+Dialog::~Dialog() = default;
+
+void Dialog::setOkButton(QAbstractButton *button)
+{
+    m_ok = button;
+    if (button)
+        connect(button, &QAbstractButton::clicked, this, &QDialog::accept);
+}
+
+void Dialog::setCancelButton(QAbstractButton *button)
+{
+    m_cancel = button;
+    if (button)
+        connect(button, &QAbstractButton::clicked, this, &QDialog::reject);
+}
+
+void Dialog::setHelpButton(QAbstractButton *button)
+{
+    m_help = button;
+    if (button)
+        connect(button, &QAbstractButton::clicked, this, &Dialog::help);
+}
+
+void Dialog::setHelpTopic(const QString &topic)
+{
+    m_helpTopic = topic;
+}
+
+QBoxLayout *Dialog::createLayout(QWidget *content)
+{
+    auto *layout = new QVBoxLayout(this);
+    layout->setContentsMargins(0, 0, 0, 0);
+    if (content)
+        layout->addWidget(content);
+    return layout;
+}
+
+void Dialog::setSaveAndRestoreGeometryFlag(bool on)
+{
+    m_keepGeometry = on;
+}
+
+void Dialog::help()
+{
+    HelpManager::showHelpTopic(QString(), m_helpTopic);
+}
+
+void Dialog::done(int result)
+{
+    if (m_keepGeometry && !objectName().isEmpty()) {
+        Settings settings(QStringLiteral("DialogGeometry"), true, true, true);
+        settings.setValue(objectName(), saveGeometry());
+    }
+    QDialog::done(result);
+}
+
+void Dialog::showEvent(QShowEvent *event)
+{
+    if (m_keepGeometry && !m_restored && !objectName().isEmpty()) {
+        m_restored = true;
+        Settings settings(QStringLiteral("DialogGeometry"), true, true, true);
+        restoreGeometry(settings.getValue(objectName()).toByteArray());
+    }
+    QDialog::showEvent(event);
+}
+
+int MessageBox::warning(QWidget *parent, const QString &caption, const QString &text, int buttons,
+                        int defaultButton)
+{
+    if (QGuiApplication::platformName() == QLatin1String("offscreen")) {
+        std::fprintf(stderr, "%s: %s\n", qUtf8Printable(caption), qUtf8Printable(text));
+        if (defaultButton)
+            return defaultButton;
+        for (int bit = 1; bit; bit <<= 1) {
+            if (buttons & bit)
+                return bit;
+        }
+        return QMessageBox::Ok;
+    }
+    return QMessageBox::warning(parent, caption, text, QMessageBox::StandardButtons(buttons),
+                                QMessageBox::StandardButton(defaultButton));
+}
+
+bool HelpManager::runWebBrowser(const QString &url)
+{
+    return QDesktopServices::openUrl(QUrl(url));
+}
+
+bool HelpManager::showHelpTopic(const QString &helpFile, const QString &topic)
+{
+    if (helpFile.isEmpty())
+        return false;
+    QUrl url = QUrl::fromLocalFile(helpFile);
+    if (!topic.isEmpty())
+        url.setFragment(topic);
+    return QDesktopServices::openUrl(url);
+}
+
+} // namespace Clip
+} // namespace Gui

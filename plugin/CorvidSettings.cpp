@@ -1,0 +1,124 @@
+#include "CorvidSettings.h"
+
+#include "host/Settings.h"
+#include "host/VantorPath.h"
+
+#include <QDateTime>
+#include <QFile>
+#include <QTextStream>
+#include <QUuid>
+
+const char *const CrvC_Settings::Group = "Corvid";
+const char *const CrvC_Settings::CollectDeviceUsage = "CollectDeviceUsage";
+const char *const CrvC_Settings::CorvidTimeStamp = "CorvidTimeStamp";
+const char *const CrvC_Settings::DontShowSendProgressDlg = "DontShowSendProgressDlg";
+const char *const CrvC_Settings::UseSSL = "UseSSL";
+const char *const CrvC_Settings::DontShowSendToDlg = "DontShowSendToDlg";
+const char *const CrvC_Settings::SelectedEmailTool = "SelectedEmailTool";
+const char *const CrvC_Settings::RandomID = "RandomID";
+
+QVariant CrvC_Settings::value(const char *key, const QVariant &defaultValue)
+{
+    const Gui::Clip::Settings settings(QString::fromLatin1(Group), true, true, true);
+    return settings.getValue(QString::fromLatin1(key), defaultValue);
+}
+
+void CrvC_Settings::setValue(const char *key, const QVariant &value)
+{
+    Gui::Clip::Settings settings(QString::fromLatin1(Group), true, true, true);
+    settings.setValue(QString::fromLatin1(key), value);
+}
+
+void CrvC_Settings::readInstallSettings(QString &timestamp, bool &collect)
+{
+    QString path;
+    for (const std::string &root : Port::VantorPath::GetInstance()) {
+        const std::string candidate = root + "/data/reports/corvidsettings";
+        if (Port::File::exist(candidate)) {
+            path = QString::fromStdString(candidate);
+            break;
+        }
+    }
+    if (path.isEmpty())
+        return;
+    QFile file(path);
+    if (!file.open(QIODevice::ReadOnly | QIODevice::Text))
+        return;
+    QTextStream in(&file);
+    in.setEncoding(QStringConverter::Utf8);
+    QString line;
+    while (in.readLineInto(&line)) {
+        const QStringList parts = line.split(QLatin1Char('='));
+        if (parts.size() < 2)
+            continue;
+        if (parts.at(0) == QLatin1String("collectusagestatistics"))
+            collect = parts.at(1) == QLatin1String("true");
+        else if (parts.at(0) == QLatin1String("timestamp"))
+            timestamp = parts.at(1);
+    }
+}
+
+bool CrvC_Settings::isCollectionEnabled()
+{
+    bool installCollect = true;
+    QString installStamp;
+    readInstallSettings(installStamp, installCollect);
+
+    const bool userCollect = collectDeviceUsage();
+    const QString userStamp = corvidTimeStamp();
+
+    if (userStamp.isEmpty())
+        return installCollect;
+    if (installStamp.isEmpty())
+        return userCollect;
+    const QDateTime install = QDateTime::fromString(installStamp, Qt::ISODate);
+    const QDateTime user = QDateTime::fromString(userStamp, Qt::ISODate);
+    return install < user ? userCollect : installCollect;
+}
+
+bool CrvC_Settings::collectDeviceUsage()
+{
+    return value(CollectDeviceUsage, true).toBool();
+}
+
+QString CrvC_Settings::corvidTimeStamp()
+{
+    return value(CorvidTimeStamp, QString()).toString();
+}
+
+bool CrvC_Settings::dontShowSendProgressDlg()
+{
+    return value(DontShowSendProgressDlg, false).toBool();
+}
+
+bool CrvC_Settings::useSsl()
+{
+    return value(UseSSL, true).toBool();
+}
+
+bool CrvC_Settings::dontShowSendToDlg(bool defaultValue)
+{
+    return value(DontShowSendToDlg, defaultValue).toBool();
+}
+
+QString CrvC_Settings::selectedEmailTool()
+{
+    return value(SelectedEmailTool, QString()).toString();
+}
+
+QString CrvC_Settings::newIdentifier()
+{
+    QString id = QUuid::createUuid().toString();
+    id.remove(QLatin1Char('{')).remove(QLatin1Char('}')).remove(QLatin1Char('-'));
+    return id;
+}
+
+QString CrvC_Settings::randomId()
+{
+    QString id = value(RandomID, QString()).toString();
+    if (id.isEmpty()) {
+        id = newIdentifier();
+        setValue(RandomID, id);
+    }
+    return id;
+}

@@ -1,0 +1,50 @@
+#pragma once
+
+#include <QString>
+
+// Everything Corvid keeps between runs outside the project: the per-user keys
+// of the group "Corvid" in the host settings store, and the install-wide
+// file data/reports/corvidsettings an administrator may place in the
+// installation. Nothing is cached: every call opens the store afresh.
+class CrvC_Settings
+{
+public:
+    static const char *const Group; // "Corvid"
+
+    // Per-user keys.
+    static const char *const CollectDeviceUsage;      // bool, default true
+    static const char *const CorvidTimeStamp;         // ISO date-time text, default empty
+    static const char *const DontShowSendProgressDlg; // bool, default false
+    static const char *const UseSSL;                  // bool, default true
+    static const char *const DontShowSendToDlg;       // bool, default false
+    static const char *const SelectedEmailTool;       // text, default empty
+    static const char *const RandomID;                // 32 hex digits, made on first use
+
+    // The effective collection switch: whoever changed it last, the user on
+    // the preference page or the administrator in the install-wide file, wins.
+    // A user who never applied the page follows the install-wide file, and
+    // collection is on when neither says anything.
+    static bool isCollectionEnabled();
+
+    // Reads the install-wide file (the first data/reports/corvidsettings in
+    // the installation roots) into `timestamp` and `collect`; leaves both
+    // unchanged when there is no readable file or the keys are absent.
+    static void readInstallSettings(QString &timestamp, bool &collect);
+
+    static bool collectDeviceUsage();
+    static QString corvidTimeStamp();
+    static bool dontShowSendProgressDlg();
+    static bool useSsl();
+    static bool dontShowSendToDlg(bool defaultValue = false);
+    static QString selectedEmailTool();
+
+    // The user's random identifier; made, stored and returned when the stored
+    // one is missing or empty.
+    static QString randomId();
+
+    static void setValue(const char *key, const QVariant &value);
+    static QVariant value(const char *key, const QVariant &defaultValue);
+
+    // A new identifier: a random UUID as 32 lower-case hexadecimal digits.
+    static QString newIdentifier();
+};
