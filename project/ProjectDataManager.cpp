@@ -1,0 +1,5 @@
+#include "ProjectDataManager.h"
+
+void ProjectDataManager::collectProjectProperties(PairList &)
+{
+}

@@ -1,0 +1,6 @@
+#include "ProjectStatistics.h"
+
+QString CrvC_ProjectStatistics::projectStatisticsSection(const QString &)
+{
+    return QString();
+}

@@ -1,0 +1,41 @@
+#pragma once
+
+#include <QList>
+#include <QMap>
+#include <QPair>
+#include <QString>
+#include <QStringList>
+
+// The fields one report build fills and reads. Owned by the report builder;
+// valid for one build only (a new report uses a new builder).
+struct CrvC_ReportData
+{
+    // Given by the caller and resolved by the builder.
+    QString projectFile; // always ends in ".orb" after a build
+    QString reportPath;  // where the page is written
+    QString targetFamily;
+
+    // Map report: target of the design.
+    QString targetDevice;
+    QString targetPackage;
+    QString targetSpeed;
+
+    // Synthesis report: one entry per category line of the macro statistics
+    // block, in file order (names may repeat).
+    QList<QPair<QString, QStringList>> macroStatistics;
+
+    // Usage XML: group name -> item texts, ordered by group name.
+    QString usageXmlPath;
+    QMap<QString, QStringList> designStatistics;
+    QMap<QString, QStringList> deviceUsage;
+    QMap<QString, QStringList> reportConfigData;
+    QMap<QString, QStringList> reportPinData;
+    qint32 reportConfigDataCount = 0;
+    qint32 reportPinDataCount = 0;
+
+    // Command log and fuse log entries, in input order.
+    QStringList commandHistory;
+
+    // Send iteration shown in the report; computed once per build.
+    QString projectIteration;
+};

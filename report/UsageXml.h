@@ -1,0 +1,17 @@
+#pragma once
+
+#include "ReportData.h"
+
+// Reader of the usage XML (<design>_usage.xml) and writer of the tables made
+// from it: Device Usage Statistics (with the macro statistics cell),
+// Configuration Data and Pin Data.
+class CrvC_UsageXml
+{
+public:
+    // Fills the four section tables and the item counters; false when the file
+    // is missing, unreadable or malformed (the tables then stay empty).
+    static bool readUsageXml(const QString &path, CrvC_ReportData &data);
+    // Appends the report lines of the three tables (the last two only when
+    // they have groups).
+    static void appendTables(const CrvC_ReportData &data, QStringList &lines);
+};

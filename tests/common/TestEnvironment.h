@@ -1,0 +1,45 @@
+#pragma once
+
+#include <QString>
+#include <QTemporaryDir>
+
+#include <memory>
+
+// Test isolation: every test process gets a private home, configuration and
+// data location (QStandardPaths test mode plus HOME and XDG_* pointing into a
+// temporary directory) and a private installation root in VANTOR, so that
+// settings, help viewer files and install-wide files of one test never leak
+// into another or into the user's own.
+namespace CorvidTest {
+
+class Environment
+{
+public:
+    // Call first thing in initTestCase().
+    Environment();
+    ~Environment();
+
+    // The private home directory.
+    QString home() const;
+    // A private installation root, searched first (VANTOR); data files of a
+    // test go to installRoot() + "/data/...".
+    QString installRoot() const;
+    // Writes `contents` to installRoot()/data/<relativePath>, creating folders.
+    bool writeDataFile(const QString &relativePath, const QByteArray &contents) const;
+    // Removes the per-user settings file (all groups).
+    void clearSettings() const;
+
+    // The staged build: orb, plug-ins, component libraries, data.
+    static QString stageDir() { return QStringLiteral(ORB_STAGE_DIR); }
+    static QString sourceDir() { return QStringLiteral(CORVID_SOURCE_DIR); }
+
+private:
+    std::unique_ptr<QTemporaryDir> m_dir;
+};
+
+// Writes `contents` to `path`, creating parent folders; false on failure.
+bool writeFile(const QString &path, const QByteArray &contents);
+// Reads a whole file; empty when it cannot be read.
+QByteArray readFile(const QString &path);
+
+} // namespace CorvidTest
