@@ -1,0 +1,68 @@
+#include "common/TestEnvironment.h"
+
+#include <QProcess>
+#include <QtTest>
+
+// orb as users run it: the real binary with the real plug-in directory.
+class TestOrb : public QObject
+{
+    Q_OBJECT
+private Q_SLOTS:
+    void initTestCase();
+    void commandLine_data();
+    void commandLine();
+
+private:
+    std::unique_ptr<CorvidTest::Environment> m_env;
+    QString m_work;
+};
+
+void TestOrb::initTestCase()
+{
+    m_env.reset(new CorvidTest::Environment);
+    m_work = m_env->home() + QLatin1String("/work");
+    QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/top_usage.xml"), "<usage/>"));
+    QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/notes.txt"), "x"));
+    QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/top_usage.XML"), "<usage/>"));
+}
+
+void TestOrb::commandLine_data()
+{
+    QTest::addColumn<QStringList>("arguments");
+    QTest::addColumn<int>("exitCode");
+    QTest::addColumn<QString>("expectedOutput"); // in stdout or stderr
+
+    QTest::newRow("help") << QStringList{"--help"} << 0 << "open FILE";
+    QTest::newRow("unclaimed file") << QStringList{"open", "notes.txt"} << 1
+                                    << "no editor can open notes.txt";
+    QTest::newRow("suffix case matters") << QStringList{"open", "top_usage.XML"} << 1
+                                         << "no editor can open";
+    QTest::newRow("usage file reaches the plug-in")
+        << QStringList{"open", "top_usage.xml"} << 0 << "Corvid: open " + m_work + "/top_usage.xml (design \"top\")";
+    QTest::newRow("design from the open context")
+        << QStringList{"open", "top_usage.xml", "--design", "blinker"} << 0 << "(design \"blinker\")";
+    QTest::newRow("open without file") << QStringList{"open"} << 1 << "open needs a file name";
+    QTest::newRow("unknown option") << QStringList{"--bogus"} << 1 << "unknown argument: --bogus";
+}
+
+void TestOrb::commandLine()
+{
+    QFETCH(QStringList, arguments);
+    QProcess orb;
+    orb.setWorkingDirectory(m_work);
+    QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
+    env.insert(QStringLiteral("ORB_DEBUG"), QStringLiteral("1"));
+    env.insert(QStringLiteral("QT_QPA_PLATFORM"), QStringLiteral("offscreen"));
+    orb.setProcessEnvironment(env);
+    orb.start(CorvidTest::Environment::stageDir() + QLatin1String("/bin/orb"), arguments);
+    QVERIFY(orb.waitForFinished(60000));
+    const QString output = QString::fromUtf8(orb.readAllStandardOutput() + orb.readAllStandardError());
+    QFETCH(QString, expectedOutput);
+    QFETCH(int, exitCode);
+    QVERIFY2(output.contains(expectedOutput), qPrintable(output));
+    QCOMPARE(orb.exitStatus(), QProcess::NormalExit);
+    QCOMPARE(orb.exitCode(), exitCode);
+}
+
+QTEST_GUILESS_MAIN(TestOrb)
+#include "tst_orb.moc"

@@ -1,0 +1,108 @@
+#include "host/StringBase.h"
+
+#include <QtTest>
+
+using Port::StringBase;
+
+class TestStringBase : public QObject
+{
+    Q_OBJECT
+private Q_SLOTS:
+    void proxyCleanUp_data();
+    void proxyCleanUp();
+    void tokens_data();
+    void tokens();
+    void replace_data();
+    void replace();
+    void format();
+};
+
+// The clean-up applied to a discovered proxy text: first ";" token, then the
+// first token delimited by "PROXY", then blanks trimmed.
+void TestStringBase::proxyCleanUp_data()
+{
+    QTest::addColumn<QString>("input");
+    QTest::addColumn<QString>("expected");
+    QTest::newRow("script answer") << "PROXY h:8080; DIRECT" << "h:8080";
+    QTest::newRow("proxy list") << "h1:8080;h2:8080" << "h1:8080";
+    QTest::newRow("plain") << "h:8080" << "h:8080";
+    QTest::newRow("tabs and blanks") << "PROXY \t h:3128 \t;x" << "h:3128";
+    QTest::newRow("empty") << "" << "";
+    QTest::newRow("only delimiters") << ";;;" << "";
+}
+
+void TestStringBase::proxyCleanUp()
+{
+    QFETCH(QString, input);
+    StringBase s(input.toStdString());
+    s.Reduce(";", StringBase::WholeDelimiter);
+    s.Reduce("PROXY", StringBase::WholeDelimiter);
+    s.Trim(" \t", StringBase::TrimBoth);
+    QFETCH(QString, expected);
+    QCOMPARE(QString::fromStdString(s.str()), expected);
+}
+
+void TestStringBase::tokens_data()
+{
+    QTest::addColumn<QString>("input");
+    QTest::addColumn<QString>("delimiters");
+    QTest::addColumn<int>("mode");
+    QTest::addColumn<QStringList>("expected");
+    QTest::newRow("any of, empty tokens skipped") << "a,,b;c" << ",;" << 0 << QStringList{"a", "b", "c"};
+    QTest::newRow("whole delimiter") << "aXYbXcXY" << "XY" << 1 << QStringList{"a", "bXc"};
+    QTest::newRow("no delimiter present") << "abc" << "|" << 0 << QStringList{"abc"};
+    QTest::newRow("empty delimiter text") << "abc" << "" << 1 << QStringList{"abc"};
+}
+
+void TestStringBase::tokens()
+{
+    QFETCH(QString, input);
+    QFETCH(QString, delimiters);
+    QFETCH(int, mode);
+    const StringBase s(input.toStdString());
+    QStringList tokens;
+    std::size_t pos = 0, begin = 0, end = 0;
+    while (s.NextTokenRange(StringBase(delimiters.toStdString()), StringBase::TokenMode(mode), pos,
+                            begin, end))
+        tokens << QString::fromStdString(s.str().substr(begin, end - begin));
+    QFETCH(QStringList, expected);
+    QCOMPARE(tokens, expected);
+}
+
+void TestStringBase::replace_data()
+{
+    QTest::addColumn<QString>("input");
+    QTest::addColumn<QString>("from");
+    QTest::addColumn<QString>("to");
+    QTest::addColumn<QString>("expected");
+    QTest::addColumn<int>("count");
+    QTest::newRow("several") << "a.b.c" << "." << "::" << "a::b::c" << 2;
+    QTest::newRow("replacement contains pattern") << "aa" << "a" << "aa" << "aaaa" << 2;
+    QTest::newRow("none") << "abc" << "x" << "y" << "abc" << 0;
+    QTest::newRow("empty pattern") << "abc" << "" << "y" << "abc" << 0;
+}
+
+void TestStringBase::replace()
+{
+    QFETCH(QString, input);
+    StringBase s(input.toStdString());
+    QFETCH(QString, from);
+    QFETCH(QString, to);
+    QFETCH(QString, expected);
+    QFETCH(int, count);
+    QCOMPARE(s.Replace(from.toStdString(), to.toStdString()), count);
+    QCOMPARE(QString::fromStdString(s.str()), expected);
+}
+
+void TestStringBase::format()
+{
+    StringBase s;
+    s.Format("%d|%s", 42, "x");
+    QCOMPARE(s.str(), std::string("42|x"));
+    const std::string big(100000, 'z');
+    s.Format("<%s>", big.c_str());
+    QCOMPARE(s.Length(), big.size() + 2);
+}
+
+QTEST_GUILESS_MAIN(TestStringBase)
+#include "tst_stringbase.moc"
