@@ -35,16 +35,10 @@ QString CrvC_CollectionCycle::designName(const QString &fileName, CitI::IInterfa
     return name;
 }
 
-void CrvC_CollectionCycle::openUsageFile(const QString &fileName, CitI::IInterface *context)
+void CrvC_CollectionCycle::currentProject(QString &projectFile, QString &targetFamily)
 {
-    const QString design = designName(fileName, context);
-    Port_MsgManData::debugStub("Corvid: open %s (design \"%s\")\n", qUtf8Printable(fileName),
-                               qUtf8Printable(design));
-    if (!fileName.endsWith(QLatin1String(".xml")))
-        return;
-
-    QString projectFile;
-    QString targetFamily;
+    projectFile.clear();
+    targetFamily.clear();
     auto *service = CitP::InstanceTable::GetInstance(GuiI::IProjectManager::serviceId());
     auto *manager = service ? static_cast<GuiI::IProjectManager *>(
                                   service->GetInterface(GuiI::IProjectManager::iid()))
@@ -58,6 +52,19 @@ void CrvC_CollectionCycle::openUsageFile(const QString &fileName, CitI::IInterfa
                 projectFile = String::convert(file->getProjectFile());
         }
     }
+}
+
+void CrvC_CollectionCycle::openUsageFile(const QString &fileName, CitI::IInterface *context)
+{
+    const QString design = designName(fileName, context);
+    Port_MsgManData::debugStub("Corvid: open %s (design \"%s\")\n", qUtf8Printable(fileName),
+                               qUtf8Printable(design));
+    if (!fileName.endsWith(QLatin1String(".xml")))
+        return;
+
+    QString projectFile;
+    QString targetFamily;
+    currentProject(projectFile, targetFamily);
 
     if (!projectFile.isEmpty() && !CrvC_Settings::isCollectionEnabled()) {
         Port_MsgManData::debugStub("Corvid: collection is switched off\n");

@@ -18,6 +18,10 @@ public:
     // current directory, as the design tools expect).
     static QString designName(const QString &fileName, CitI::IInterface *context);
 
+    // The host's current project: its file and target family, both empty
+    // when the host has no project manager or no current project.
+    static void currentProject(QString &projectFile, QString &targetFamily);
+
     // The host's open request for a usage file.
     static void openUsageFile(const QString &fileName, CitI::IInterface *context);
 
