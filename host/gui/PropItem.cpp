@@ -35,10 +35,17 @@ QWidget *PropItem::createPage(QWidget *container)
     if (m_page || !m_creator || m_slot.isEmpty())
         return m_page;
     const QMetaObject *mo = m_creator->metaObject();
-    const int index = mo->indexOfMethod(QMetaObject::normalizedSignature(m_slot.constData()));
-    if (index < 0)
-        return nullptr;
-    const QMetaMethod method = mo->method(index);
+    int index = mo->indexOfMethod(QMetaObject::normalizedSignature(m_slot.constData()));
+    if (index < 0) {
+        // The slot text may spell the item type without its namespace; take
+        // the two-argument method of that name.
+        const QByteArray name = m_slot.left(m_slot.indexOf('('));
+        for (int i = mo->methodOffset(); i < mo->methodCount() && index < 0; ++i) {
+            if (mo->method(i).name() == name && mo->method(i).parameterCount() == 2)
+                index = i;
+        }
+    }
+    const QMetaMethod method = index < 0 ? QMetaMethod() : mo->method(index);
     if (method.parameterCount() != 2)
         return nullptr;
     // Pass the arguments under the type names the slot declares, so that a

@@ -8,6 +8,7 @@
 #include <QLabel>
 #include <QListWidget>
 #include <QPushButton>
+#include <QSignalBlocker>
 #include <QStackedWidget>
 #include <QVBoxLayout>
 
@@ -81,8 +82,10 @@ void PropSheet::showItem(int index)
         delete container;
     }
     m_pages->setCurrentIndex(index);
-    if (m_list->currentRow() != index)
+    if (m_list->currentRow() != index) {
+        const QSignalBlocker blocker(m_list);
         m_list->setCurrentRow(index);
+    }
     PropSheetEvent event(PropSheetEvent::ActivatePage);
     QCoreApplication::sendEvent(page, &event);
 }
