@@ -3,7 +3,8 @@
 #include "ReportData.h"
 
 // The design tools' command history (<design>.cmd_log and fuse.log) and the
-// "Tool Usage" table made from it.
+// "Tool Usage" table made from it. Entries are made anonymous on reading: the
+// design name, quoted arguments and file names give way to placeholders.
 class CrvC_CommandLog
 {
 public:
@@ -13,4 +14,7 @@ public:
     static bool checkFuseLog(const QString &path, CrvC_ReportData &data);
     // The "Tool Usage" table, its lines joined with "\n".
     static QString commandLineHistorySection(const CrvC_ReportData &data);
+
+    // One log line as it is reported, for a log whose file base name is `design`.
+    static QString anonymized(const QString &line, const QString &design);
 };

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "project/ProjectDataManager.h"
+
 #include <QString>
 
 // The "Project Statistics" table: the project facts of the host's project
@@ -7,5 +9,10 @@
 class CrvC_ProjectStatistics
 {
 public:
+    // The table for the host's current project and the age of `projectFile`.
     static QString projectStatisticsSection(const QString &projectFile);
+
+    // The table for the given facts, followed by the age row ("Project
+    // duration(days)") with `age` (empty when unknown): two cells to a row.
+    static QString sectionText(const ProjectDataManager::PairList &rows, const QString &age);
 };

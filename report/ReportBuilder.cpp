@@ -120,13 +120,15 @@ void CrvC_ReportBuilder::buildReport(const QString &projectFileArg, QString desi
 
     if (!m_data.commandHistory.isEmpty())
         lines << CrvC_CommandLog::commandLineHistorySection(m_data);
-    lines << CrvC_RunStatistics::runStatisticsSection(m_data);
+    lines << CrvC_RunStatistics::runStatisticsSection(m_data.projectFile);
     lines << CrvC_HelpViewerData().sectionText();
     lines << CrvC_ProjectStatistics::projectStatisticsSection(m_data.projectFile);
     lines << CrvC_CoresStatistics().sectionText(
         projectFilePath(designName + QLatin1String("_lnkgen.drpt")));
-    lines << CrvC_RunStatistics::parUsageSection();
-    lines << CrvC_RunStatistics::osimUsageSection();
+    lines << CrvC_RunStatistics::parUsageSection(
+        projectFilePath(QStringLiteral("par_usage_statistics.html")));
+    lines << CrvC_RunStatistics::osimUsageSection(
+        projectFilePath(QStringLiteral("osim/osim_usage_statistics.html")));
     lines << QStringLiteral("</BODY></HTML>");
 
     m_page = lines.join(QLatin1Char('\n'));

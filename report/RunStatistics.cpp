@@ -1,16 +1,60 @@
 #include "RunStatistics.h"
 
-QString CrvC_RunStatistics::runStatisticsSection(const CrvC_ReportData &)
+#include "host/AutoRelease.h"
+#include "host/Factory.h"
+#include "host/QualityData.h"
+#include "host/String.h"
+
+#include <QFile>
+#include <QFileInfo>
+#include <QTextStream>
+
+namespace {
+
+QString subReport(const QString &path, QLatin1String lineEnd)
 {
-    return QString();
+    QString text = QStringLiteral("&nbsp;<BR>");
+    if (!QFileInfo(path).isFile())
+        return text;
+    QFile file(path);
+    if (!file.open(QIODevice::ReadOnly))
+        return text;
+    QTextStream in(&file);
+    QString line;
+    while (in.readLineInto(&line))
+        text += line + lineEnd;
+    return text;
 }
 
-QString CrvC_RunStatistics::parUsageSection()
+} // namespace
+
+QString CrvC_RunStatistics::runStatisticsSection(const QString &projectFile)
 {
-    return QString();
+    if (!CitP::Factory::LoadLibraryFactory(UtilC::IRunStatisticsReader::libraryName()))
+        return QString();
+    Prjrep::AutoRelease<CitI::IInterface> object(
+        CitP::Factory::CreateInstanceRef(UtilC::IRunStatisticsReader::classId()));
+    Prjrep::AutoCast<UtilC::IRunStatisticsReader> reader(object.get());
+    if (!reader)
+        return QString();
+
+    Port::StringBase html;
+    reader->readRunStatistics(Gui::Clip::String::convert(projectFile), html);
+    html.Replace("<table>",
+                 "&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>"
+                 "<dtag-section name=\"RunStatistics\">"
+                 "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=8><B>Software Quality</B></TD></TR>"
+                 "<TR ALIGN=LEFT><TD COLSPAN=8><B>Run Statistics</B></TD></TR>");
+    html.Replace("</table>", "</dtag-section></TABLE>");
+    return Gui::Clip::String::convert(html);
 }
 
-QString CrvC_RunStatistics::osimUsageSection()
+QString CrvC_RunStatistics::parUsageSection(const QString &path)
 {
-    return QString();
+    return subReport(path, QLatin1String("\n"));
+}
+
+QString CrvC_RunStatistics::osimUsageSection(const QString &path)
+{
+    return subReport(path, QLatin1String(""));
 }
