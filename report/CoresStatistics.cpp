@@ -90,10 +90,9 @@ void CrvC_CoresStatistics::parse()
 {
     m_coreInstances.clear();
     m_currentInstance = -1;
-    if (CrvC_XmlDepthGuard::parseFile(m_fileName, *this) == CrvC_XmlDepthGuard::Outcome::Refused) {
+    // A refused document counts as unreadable, whatever was collected.
+    if (CrvC_XmlDepthGuard::parseFile(m_fileName, *this) == CrvC_XmlDepthGuard::Outcome::Refused)
         m_coreInstances.clear();
-        m_currentInstance = -1;
-    }
 }
 
 QString CrvC_CoresStatistics::sectionFromInstances() const
