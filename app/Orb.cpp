@@ -2,6 +2,7 @@
 
 #include "host/FileSupervisor.h"
 #include "host/String.h"
+#include "host/project/OrbProject.h"
 
 #include <QCoreApplication>
 
@@ -19,7 +20,7 @@ bool openFile(const QString &fileName, CitI::IInterface *context)
 
 QString currentProjectName()
 {
-    return QString();
+    return OrbProject::currentProjectName();
 }
 
 QString currentProjectDescription()

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <QDate>
 #include <QString>
 
 // Corvid's values in the project repository of a project file (section
@@ -19,6 +20,21 @@ public:
     // Whole days from the project's creation date to today, or empty text
     // when the project has no valid creation date.
     QString projectAgeInDays(const QString &projectFile) const;
+    // The same, counted to `today`.
+    QString projectAgeInDays(const QString &projectFile, const QDate &today) const;
+
+    // The project identifier a report shows: the stored one; when the
+    // project file exists but has none yet, a new one that is stored; when
+    // the file does not exist, a new one that is not stored (so each such
+    // report carries a different identifier). 32 lower-case hex digits.
+    QString projectIdentifier(const QString &projectFile) const;
+    // The send iteration a report shows: the stored counter re-formatted in
+    // base 10, or "1" when the file does not exist or holds no counter that
+    // parses.
+    QString sendIteration(const QString &projectFile) const;
+    // Counts a send of a report that showed `shownIteration`: stores that
+    // number plus one, when the project file exists and the number parses.
+    void countSend(const QString &projectFile, const QString &shownIteration) const;
 
 private:
     ProjectRepositoryValues() = default;

@@ -1,0 +1,196 @@
+#include "RepositoryStore.h"
+
+#include "host/Repository.h"
+
+#include <QAtomicInteger>
+#include <QFileInfo>
+#include <QSqlDatabase>
+#include <QSqlError>
+#include <QSqlQuery>
+#include <QThread>
+#include <QVariant>
+
+namespace Prjrep {
+namespace {
+
+// How long one statement waits for a lock held by another connection, and
+// how often a transaction that still found the file locked is tried again.
+const int BusyTimeoutMs = 2000;
+const int MaxAttempts = 8;
+
+bool isBusy(const QSqlError &error)
+{
+    const int code = error.nativeErrorCode().toInt() & 0xff;
+    return code == 5 /* SQLITE_BUSY */ || code == 6 /* SQLITE_LOCKED */;
+}
+
+QString newConnectionName()
+{
+    static QAtomicInteger<quint64> counter;
+    return QStringLiteral("Prjrep_Repository-%1").arg(++counter);
+}
+
+} // namespace
+
+QString RepositoryStore::fileNameFor(const QString &projectFile)
+{
+    QString name = projectFile;
+    if (name.endsWith(QLatin1String(".orb"), Qt::CaseInsensitive))
+        name.chop(4);
+    return name + QLatin1String(".orbrepo");
+}
+
+std::shared_ptr<RepositoryStore> RepositoryStore::open(const QString &fileName, bool writable,
+                                                       bool create, int *status)
+{
+    *status = StatusFailed;
+    if (!QFileInfo::exists(fileName) && !(writable && create)) {
+        *status = StatusNotFound;
+        return nullptr;
+    }
+    const QString connectionName = newConnectionName();
+    bool opened = false;
+    {
+        QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), connectionName);
+        if (db.isValid()) {
+            db.setDatabaseName(fileName);
+            QString options = QStringLiteral("QSQLITE_BUSY_TIMEOUT=%1").arg(BusyTimeoutMs);
+            if (!writable)
+                options += QLatin1String(";QSQLITE_OPEN_READONLY");
+            db.setConnectOptions(options);
+            opened = db.open();
+        }
+    }
+    if (!opened) {
+        QSqlDatabase::removeDatabase(connectionName);
+        return nullptr;
+    }
+    std::shared_ptr<RepositoryStore> store(new RepositoryStore(connectionName, writable));
+    if (writable && (*status = store->createSchema()) != StatusOk)
+        return nullptr;
+    *status = StatusOk;
+    return store;
+}
+
+RepositoryStore::RepositoryStore(const QString &connectionName, bool writable)
+    : m_connectionName(connectionName)
+    , m_writable(writable)
+{
+}
+
+RepositoryStore::~RepositoryStore()
+{
+    {
+        QSqlDatabase db = QSqlDatabase::database(m_connectionName, false);
+        db.close();
+    }
+    QSqlDatabase::removeDatabase(m_connectionName);
+}
+
+int RepositoryStore::run(bool write, const std::function<int(QSqlQuery &)> &work)
+{
+    const QSqlDatabase db = QSqlDatabase::database(m_connectionName, false);
+    for (int attempt = 1;; ++attempt) {
+        QSqlQuery query(db);
+        query.setForwardOnly(true);
+        bool busy = false;
+        if (write && !query.exec(QStringLiteral("BEGIN IMMEDIATE"))) {
+            busy = isBusy(query.lastError());
+        } else {
+            const int status = work(query);
+            busy = status == StatusFailed && isBusy(query.lastError());
+            query.finish();
+            if (!write && status != StatusFailed)
+                return status;
+            if (write) {
+                if (status != StatusFailed && query.exec(QStringLiteral("COMMIT")))
+                    return status;
+                busy = busy || isBusy(query.lastError());
+                QSqlQuery rollback(db);
+                rollback.exec(QStringLiteral("ROLLBACK"));
+            }
+        }
+        if (!busy || attempt >= MaxAttempts)
+            return StatusFailed;
+        QThread::msleep(20 * attempt);
+    }
+}
+
+int RepositoryStore::createSchema()
+{
+    return run(true, [](QSqlQuery &query) {
+        const bool ok =
+            query.exec(QStringLiteral("CREATE TABLE IF NOT EXISTS sections("
+                                      "id INTEGER PRIMARY KEY, parent INTEGER NOT NULL, "
+                                      "name TEXT NOT NULL, UNIQUE(parent, name))"))
+            && query.exec(QStringLiteral("CREATE TABLE IF NOT EXISTS entries("
+                                         "section INTEGER NOT NULL, key TEXT NOT NULL, "
+                                         "value TEXT NOT NULL, PRIMARY KEY(section, key))"))
+            && query.exec(QStringLiteral("PRAGMA user_version = 1"));
+        return ok ? int(StatusOk) : int(StatusFailed);
+    });
+}
+
+int RepositoryStore::findSection(qint64 parent, const QString &name, bool create, qint64 *id)
+{
+    auto select = [&](QSqlQuery &query) {
+        if (!query.prepare(QStringLiteral("SELECT id FROM sections WHERE parent = ? AND name = ?")))
+            return int(StatusFailed);
+        query.addBindValue(parent);
+        query.addBindValue(name);
+        if (!query.exec())
+            return int(StatusFailed);
+        if (!query.next())
+            return int(StatusNotFound);
+        *id = query.value(0).toLongLong();
+        return int(StatusOk);
+    };
+    const int status = run(false, select);
+    if (status != StatusNotFound || !create)
+        return status;
+    if (!m_writable)
+        return StatusDenied;
+    return run(true, [&](QSqlQuery &query) {
+        if (!query.prepare(QStringLiteral("INSERT OR IGNORE INTO sections(parent, name) VALUES(?, ?)")))
+            return int(StatusFailed);
+        query.addBindValue(parent);
+        query.addBindValue(name);
+        if (!query.exec())
+            return int(StatusFailed);
+        // Another process may have made it first; either way it is there now.
+        return select(query);
+    });
+}
+
+int RepositoryStore::value(qint64 section, const QString &key, QString *value)
+{
+    return run(false, [&](QSqlQuery &query) {
+        if (!query.prepare(QStringLiteral("SELECT value FROM entries WHERE section = ? AND key = ?")))
+            return int(StatusFailed);
+        query.addBindValue(section);
+        query.addBindValue(key);
+        if (!query.exec())
+            return int(StatusFailed);
+        if (!query.next())
+            return int(StatusNotFound);
+        *value = query.value(0).toString();
+        return int(StatusOk);
+    });
+}
+
+int RepositoryStore::setValue(qint64 section, const QString &key, const QString &value)
+{
+    if (!m_writable)
+        return StatusDenied;
+    return run(true, [&](QSqlQuery &query) {
+        if (!query.prepare(QStringLiteral(
+                "INSERT OR REPLACE INTO entries(section, key, value) VALUES(?, ?, ?)")))
+            return int(StatusFailed);
+        query.addBindValue(section);
+        query.addBindValue(key);
+        query.addBindValue(value);
+        return query.exec() ? int(StatusOk) : int(StatusFailed);
+    });
+}
+
+} // namespace Prjrep
