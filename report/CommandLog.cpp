@@ -2,27 +2,123 @@
 
 #include <QFile>
 #include <QFileInfo>
-#include <QRegularExpression>
+#include <QStringMatcher>
 #include <QTextStream>
+
+namespace {
+
+constexpr QStringView designMark(u"<design>");
+constexpr QStringView quotedMark(u"<orb_file>");
+constexpr QStringView fileNameMark(u"<fname>.");
+
+// Makes log lines of one design anonymous. Logs run to hundreds of thousands
+// of lines, so each step is one scan of the line by hand: matching the
+// patterns ".*" and "\S+[.]" as regular expressions took most of the time
+// of reading a long log. The results are the same as the patterns'.
+class Anonymizer
+{
+public:
+    explicit Anonymizer(const QString &design) : m_design(design), m_matcher(design) {}
+
+    QString operator()(const QString &line) const
+    {
+        // After simplifying, a blank is the only white space left, and no
+        // replacement below brings any back.
+        QString text = line.simplified();
+        replaceDesign(text);
+        replaceQuoted(text);
+        return replaceFileNames(text);
+    }
+
+private:
+    // Every occurrence of the design name, case-sensitive, left to right.
+    void replaceDesign(QString &text) const
+    {
+        if (m_design.isEmpty())
+            return;
+        qsizetype at = m_matcher.indexIn(text);
+        if (at < 0)
+            return;
+        QString out;
+        out.reserve(text.size() + 8);
+        qsizetype from = 0;
+        for (; at >= 0; at = m_matcher.indexIn(text, from)) {
+            out += QStringView(text).mid(from, at - from);
+            out += designMark;
+            from = at + m_design.size();
+        }
+        out += QStringView(text).mid(from);
+        text = std::move(out);
+    }
+
+    // ".*": from the first to the last double quote, when there are two.
+    static void replaceQuoted(QString &text)
+    {
+        const qsizetype first = text.indexOf(QLatin1Char('"'));
+        const qsizetype last = text.lastIndexOf(QLatin1Char('"'));
+        if (first >= 0 && last > first)
+            text.replace(first, last - first + 1, quotedMark.data(), quotedMark.size());
+    }
+
+    // \S+[.]: in each word, everything up to its last dot, when at least one
+    // character precedes that dot. A word matches from its start or not at
+    // all, and nothing after its last dot can match again.
+    static QString replaceFileNames(const QString &text)
+    {
+        if (!text.contains(QLatin1Char('.')))
+            return text;
+        const QStringView view(text);
+        QString out;
+        out.reserve(text.size() + 16);
+        for (qsizetype start = 0;;) {
+            qsizetype end = view.indexOf(QLatin1Char(' '), start);
+            if (end < 0)
+                end = view.size();
+            const QStringView word = view.mid(start, end - start);
+            const qsizetype dot = word.lastIndexOf(QLatin1Char('.'));
+            if (dot >= 1) {
+                out += fileNameMark;
+                out += word.mid(dot + 1);
+            } else {
+                out += word;
+            }
+            if (end == view.size())
+                break;
+            out += QLatin1Char(' ');
+            start = end + 1;
+        }
+        return out;
+    }
+
+    QString m_design;
+    QStringMatcher m_matcher;
+};
+
+// `text` with "<" and ">" as "&lt;" and "&gt;" ("&" and quotes stay).
+qsizetype escapedSize(QStringView text)
+{
+    return text.size() + 3 * (text.count(QLatin1Char('<')) + text.count(QLatin1Char('>')));
+}
+
+void appendEscaped(QString &out, QStringView text)
+{
+    qsizetype from = 0;
+    for (qsizetype i = 0; i < text.size(); ++i) {
+        const QChar c = text.at(i);
+        if (c != QLatin1Char('<') && c != QLatin1Char('>'))
+            continue;
+        out += text.mid(from, i - from);
+        out += c == QLatin1Char('<') ? QStringView(u"&lt;") : QStringView(u"&gt;");
+        from = i + 1;
+    }
+    out += text.mid(from);
+}
+
+} // namespace
 
 QString CrvC_CommandLog::anonymized(const QString &line, const QString &design)
 {
-    // Everything from the first to the last double quote: one quoted argument.
-    static const QRegularExpression quoted(QStringLiteral("\".*\""));
-    // A word up to its last dot, where at least one character precedes that
-    // dot: the path and name of a file, keeping its extension. The plain
-    // "\S+[.]" would backtrack over the rest of every word from every start
-    // position, which is quadratic in a long word; this form matches the
-    // same text from the word's start only, and each group stops at the next
-    // dot without backtracking.
-    static const QRegularExpression fileName(QStringLiteral("(?<!\\S)\\S(?:[^\\s.]*+\\.)+"));
-
-    QString entry = line.simplified();
-    if (!design.isEmpty())
-        entry.replace(design, QLatin1String("<design>"));
-    entry.replace(quoted, QStringLiteral("<orb_file>"));
-    entry.replace(fileName, QStringLiteral("<fname>."));
-    return entry;
+    return Anonymizer(design)(line);
 }
 
 bool CrvC_CommandLog::readCommandLog(const QString &path, CrvC_ReportData &data)
@@ -34,11 +130,11 @@ bool CrvC_CommandLog::readCommandLog(const QString &path, CrvC_ReportData &data)
     if (!file.open(QIODevice::ReadOnly))
         return false;
 
-    const QString design = info.baseName();
+    const Anonymizer anonymize(info.baseName());
     QTextStream in(&file);
     QString line;
     while (in.readLineInto(&line))
-        data.commandHistory.append(anonymized(line, design));
+        data.commandHistory.append(anonymize(line));
     return true;
 }
 
@@ -52,18 +148,28 @@ bool CrvC_CommandLog::checkFuseLog(const QString &path, CrvC_ReportData &data)
 
 QString CrvC_CommandLog::commandLineHistorySection(const CrvC_ReportData &data)
 {
-    QString text = QStringLiteral(
-        "&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
-        "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD><B>Tool Usage</B></TD></TR>\n"
-        "<TR VALIGN=TOP><TD ALIGN=LEFT>Command Line History"
-        "<dtag-section name=\"CommandLineLog\"><UL>\n");
+    const QStringView head(
+        u"&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
+        u"<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD><B>Tool Usage</B></TD></TR>\n"
+        u"<TR VALIGN=TOP><TD ALIGN=LEFT>Command Line History"
+        u"<dtag-section name=\"CommandLineLog\"><UL>\n");
+    const QStringView itemStart(u"<LI><dtag-cmdline>");
+    const QStringView itemEnd(u"</dtag-cmdline></LI>\n");
+    const QStringView tail(u"</dtag-section></UL></TD></TR>\n</TABLE>");
+
+    // The whole table is allocated once: a long history makes a text of many
+    // megabytes.
+    qsizetype size = head.size() + tail.size();
+    for (const QString &entry : data.commandHistory)
+        size += itemStart.size() + escapedSize(entry) + itemEnd.size();
+    QString text;
+    text.reserve(size);
+    text += head;
     for (const QString &entry : data.commandHistory) {
-        QString escaped = entry;
-        escaped.replace(QLatin1Char('<'), QLatin1String("&lt;"));
-        escaped.replace(QLatin1Char('>'), QLatin1String("&gt;"));
-        text += QLatin1String("<LI><dtag-cmdline>") + escaped
-                + QLatin1String("</dtag-cmdline></LI>\n");
+        text += itemStart;
+        appendEscaped(text, entry);
+        text += itemEnd;
     }
-    text += QLatin1String("</dtag-section></UL></TD></TR>\n</TABLE>");
+    text += tail;
     return text;
 }
