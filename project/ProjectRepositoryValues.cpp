@@ -160,5 +160,11 @@ void ProjectRepositoryValues::countSend(const QString &projectFile,
     if (!fileExists(projectFile) || !parseCounter(shownIteration, &number)
         || number == std::numeric_limits<qlonglong>::max())
         return;
+    // A stored counter that does not parse was shown as 1; it is left as it
+    // is rather than overwritten with 2.
+    const QString stored = getValue(projectFile, QLatin1String(SendIterationKey));
+    qlonglong storedNumber = 0;
+    if (!stored.isEmpty() && !parseCounter(stored, &storedNumber))
+        return;
     setValue(projectFile, QLatin1String(SendIterationKey), QString::number(number + 1));
 }

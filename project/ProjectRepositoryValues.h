@@ -33,7 +33,9 @@ public:
     // parses.
     QString sendIteration(const QString &projectFile) const;
     // Counts a send of a report that showed `shownIteration`: stores that
-    // number plus one, when the project file exists and the number parses.
+    // number plus one, when the project file exists, the number parses and
+    // the stored counter is either absent or parses too (a counter that
+    // does not parse is never overwritten).
     void countSend(const QString &projectFile, const QString &shownIteration) const;
 
 private:

@@ -1,0 +1,336 @@
+#include "common/TestEnvironment.h"
+
+#include "host/AutoRelease.h"
+#include "host/DesignData.h"
+#include "host/InstanceTable.h"
+#include "host/MsgManData.h"
+#include "host/ProjectManager.h"
+#include "host/String.h"
+#include "host/project/HostObject.h"
+#include "host/project/OrbProject.h"
+#include "project/ProjectDataManager.h"
+
+#include <QtTest>
+
+using Gui::Clip::String;
+
+// The project facts that Corvid gathers from the host's project model, read
+// from project files written here and opened as the current project.
+class TestProjectDataManager : public QObject
+{
+    Q_OBJECT
+private Q_SLOTS:
+    void initTestCase();
+    void init();
+    void cleanup();
+    void collect_data();
+    void collect();
+    void noCurrentProject();
+    void fileManagerFailures_data();
+    void fileManagerFailures();
+
+private:
+    QStringList collectPairs();
+    QStringList debugLines() const;
+
+    std::unique_ptr<CorvidTest::Environment> m_env;
+    std::vector<Port_MsgManData::Message> m_messages;
+    Port_MsgManData::Sink m_previousSink;
+    int m_files = 0;
+};
+
+namespace {
+
+QString cell(const char *tag, const QString &text)
+{
+    return QStringLiteral("<%1>%2</%1>").arg(QLatin1String(tag), text);
+}
+
+QString design(const QString &name, const QString &value)
+{
+    return cell("dtag-design-property-name", name) + QLatin1Char('\t')
+           + cell("dtag-design-property-value", value);
+}
+
+QString partitions(int count)
+{
+    return QLatin1String("Partitions count\t") + cell("dtag-partitions-count", QString::number(count));
+}
+
+QString source(const QString &type, int count)
+{
+    return cell("dtag-design-source-type-name", type) + QLatin1Char('\t')
+           + cell("dtag-design-source-type-count", QString::number(count));
+}
+
+QString process(const QString &name, const QString &value)
+{
+    return cell("dtag-process-property-name", name) + QLatin1Char('\t')
+           + cell("dtag-process-property-value", value);
+}
+
+QByteArray projectFile(const QByteArray &properties, const QByteArray &sources = QByteArray(),
+                        const QByteArray &partitionList = QByteArray(),
+                        const QByteArray &processProperties = QByteArray())
+{
+    return "<project name='blinky'>\n"
+           "<target family='Xc6' device='xc6a25' package='csg324' speed='-2'/>\n"
+           "<properties>" + properties + "</properties>\n"
+           "<sources>" + sources + "</sources>\n"
+           "<partitions>" + partitionList + "</partitions>\n"
+           "<processProperties>" + processProperties + "</processProperties>\n"
+           "</project>\n";
+}
+
+// A project that has the real project's design data but a file manager of
+// its own making (none, or one without a file list).
+class FileManagerWithoutFiles : public OrbProject::HostObject<Dpm::IFileManager>
+{
+public:
+    int getFiles(Dpm::IHdlFileIterator **files) override
+    {
+        *files = nullptr;
+        return 0;
+    }
+};
+
+class ProjectWithBrokenFiles : public OrbProject::HostObject<Dpm::IProject>
+{
+public:
+    ProjectWithBrokenFiles(Dpm::IProject *real, bool haveFileManager)
+        : m_real(real), m_haveFileManager(haveFileManager)
+    {
+    }
+    CitI::IInterface *getDesignData() override { return m_real->getDesignData(); }
+    CitI::IInterface *getFileManager() override
+    {
+        return m_haveFileManager ? static_cast<Dpm::IFileManager *>(new FileManagerWithoutFiles)
+                                 : nullptr;
+    }
+
+private:
+    Dpm::IProject *m_real;
+    bool m_haveFileManager;
+};
+
+class ManagerOf : public GuiI::IProjectManager
+{
+public:
+    explicit ManagerOf(ProjectWithBrokenFiles *project) : m_project(project) {}
+    CitI::IInterface *GetInterface(const Port::XUID &iid) override
+    {
+        return iid == GuiI::IProjectManager::iid() ? this : nullptr;
+    }
+    Port::StringBase getTargetFamily(CitI::IInterface *) override { return "Xc6"; }
+    CitI::IInterface *getCurrentProject() override
+    {
+        m_project->AddRef();
+        return static_cast<Dpm::IProject *>(m_project);
+    }
+
+private:
+    ProjectWithBrokenFiles *m_project;
+};
+
+} // namespace
+
+void TestProjectDataManager::initTestCase()
+{
+    m_env.reset(new CorvidTest::Environment);
+}
+
+void TestProjectDataManager::init()
+{
+    m_messages.clear();
+    m_previousSink = Port_MsgManData::setSink(
+        [this](const Port_MsgManData::Message &m) { m_messages.push_back(m); });
+}
+
+void TestProjectDataManager::cleanup()
+{
+    Port_MsgManData::setSink(m_previousSink);
+    OrbProject::closeCurrentProject();
+}
+
+QStringList TestProjectDataManager::collectPairs()
+{
+    ProjectDataManager::PairList pairs;
+    ProjectDataManager::collectProjectProperties(pairs);
+    QStringList result;
+    for (const ProjectDataManager::Pair &pair : pairs)
+        result << String::convert(pair.first) + QLatin1Char('\t') + String::convert(pair.second);
+    return result;
+}
+
+QStringList TestProjectDataManager::debugLines() const
+{
+    QStringList lines;
+    for (const Port_MsgManData::Message &m : m_messages) {
+        if (m.kind == Port_MsgManData::Debug)
+            lines << QString::fromStdString(m.text);
+    }
+    return lines;
+}
+
+void TestProjectDataManager::collect_data()
+{
+    QTest::addColumn<QByteArray>("contents");
+    QTest::addColumn<QStringList>("expected");
+    QTest::addColumn<QStringList>("diagnostics"); // among the debug lines
+
+    QTest::newRow("only the synthesis tool has a template")
+        << projectFile("<property name='PROP_Synthesis_Tool' value='Synth (VHDL/Verilog)'/>")
+        << QStringList{design("PROP_Synthesis_Tool", "Synth (VHDL/Verilog)"), partitions(0)}
+        << QStringList{"Failed to get template for Property PROP_Simulator\n",
+                       "Failed to get template for Property PROP_UseTraceHint\n"};
+
+    QTest::newRow("design properties in their fixed order")
+        << projectFile("<property name='PROP_UseTraceHint' value='false'/>"
+                       "<property name='PROP_Enable_Incremental_Messaging'/>"
+                       "<property name='PROP_Enable_Message_Filtering' value='false'/>"
+                       "<property name='PROP_PreferredLanguage' value='VHDL'/>"
+                       "<property name='PROP_Top_Level_Module_Type' value='HDL'/>"
+                       "<property name='PROP_Simulator' value='OSim (VHDL/Verilog)'/>"
+                       "<property name='PROP_Synthesis_Tool' value='Synth &amp; Co'/>")
+        << QStringList{design("PROP_Synthesis_Tool", "Synth & Co"),
+                       design("PROP_Simulator", "OSim (VHDL/Verilog)"),
+                       design("PROP_Top_Level_Module_Type", "HDL"),
+                       design("PROP_PreferredLanguage", "VHDL"),
+                       design("PROP_Enable_Message_Filtering", "false"),
+                       design("PROP_UseTraceHint", "false"), partitions(0)}
+        << QStringList{"Failed to get Property Instance for PROP_Enable_Incremental_Messaging\n"};
+
+    QTest::newRow("two partitions")
+        << projectFile("", "", "<partition name='/blinky/u_pwm'/><partition name='/blinky/u_debounce'/>")
+        << QStringList{partitions(2)} << QStringList();
+
+    QTest::newRow("three VHDL and two Verilog files")
+        << projectFile("",
+                       "<file path='src/top.vhd'/><file path='src/pwm.v'/>"
+                       "<file path='src/debounce.vhdl' type='VHDL'/><file path='src/uart.v'/>"
+                       "<file path='src/pkg.vhd'/>"
+                       "<file path='sim/tb.vhd' association='Simulation'/>"
+                       "<file path='doc/notes.txt'/>")
+        << QStringList{partitions(0), source("VHDL", 3), source("Verilog", 2)} << QStringList();
+
+    QTest::newRow("file property reads changed")
+        << projectFile("", "", "",
+                       "<processProperty name='PROP_SynthConstraintsFile' value='/home/me/top.xcf' "
+                       "file='true'/>")
+        << QStringList{partitions(0), process("PROP_SynthConstraintsFile", "changed")}
+        << QStringList();
+
+    QTest::newRow("working directory never appears")
+        << projectFile("", "", "",
+                       "<processProperty name='PROP_WorkingDirectory' value='/tmp/work'/>"
+                       "<processProperty name='PROP_MapEffort' value='High'/>")
+        << QStringList{partitions(0), process("PROP_MapEffort", "High")} << QStringList();
+
+    QTest::newRow("filter selects the process properties")
+        << projectFile("<property name='PROP_Synthesis_Tool' value='Synth' enabled='false'/>"
+                       "<property name='PROP_Simulator' value='OSim'/>",
+                       "", "",
+                       "<processProperty name='A' value='a'><filter key='DEVICE' value='xc6a25'/></processProperty>"
+                       "<processProperty name='B' value='b'><filter key='DEVICE' value='xc6a50'/></processProperty>"
+                       "<processProperty name='C' value='c'><filter key='PM' value='XC6'/></processProperty>"
+                       "<processProperty name='D' value='d'><filter key='SYNTH_TOOL_IS_ENABLED' value='TRUE'/></processProperty>"
+                       "<processProperty name='E' value='e'><filter key='SYNTH_TOOL_IS_ENABLED' value='FALSE'/></processProperty>"
+                       "<processProperty name='F' value='f'><filter key='SYNTHESIS_TOOL' value='Other'/>"
+                       "<filter key='SYNTHESIS_TOOL' value='Synth'/><filter key='SPEED' value='-2'/></processProperty>"
+                       "<processProperty name='G' value='g'><filter key='SIMULATOR_TOOL' value='OSim'/>"
+                       "<filter key='TLMT' value='HDL'/></processProperty>")
+        << QStringList{design("PROP_Synthesis_Tool", "Synth"), design("PROP_Simulator", "OSim"),
+                       partitions(0), process("A", "a"), process("C", "c"), process("E", "e"),
+                       process("F", "f")}
+        << QStringList();
+
+    QTest::newRow("excluded, hidden and value-less entries are left out")
+        << projectFile("", "", "",
+                       "<processProperty name='X' value='x' excluded='true'/>"
+                       "<processProperty name='Y' value='y' hidden='true'/>"
+                       "<processProperty id='z.id' name='Z'/>"
+                       "<processProperty name='W' value=''/>")
+        << QStringList{partitions(0), process("W", "")}
+        << QStringList{"NULL iPropInstance: z.id\n"};
+}
+
+void TestProjectDataManager::collect()
+{
+    QFETCH(QByteArray, contents);
+    QFETCH(QStringList, expected);
+    QFETCH(QStringList, diagnostics);
+    const QString file =
+        m_env->home() + QStringLiteral("/collect-%1.orb").arg(++m_files);
+    QVERIFY(CorvidTest::writeFile(file, contents));
+    QString error;
+    QVERIFY2(OrbProject::openCurrentProject(file, &error), qPrintable(error));
+
+    QCOMPARE(collectPairs(), expected);
+    const QStringList debug = debugLines();
+    for (const QString &line : diagnostics)
+        QVERIFY2(debug.contains(line), qPrintable(debug.join(QLatin1Char('|'))));
+    for (const Port_MsgManData::Message &m : m_messages)
+        QCOMPARE(m.kind, Port_MsgManData::Debug); // no errors for a sound project
+}
+
+void TestProjectDataManager::noCurrentProject()
+{
+    OrbProject::closeCurrentProject();
+    ProjectDataManager::PairList pairs{{"kept", "as it was"}};
+    ProjectDataManager::collectProjectProperties(pairs);
+    QCOMPARE(pairs.size(), std::size_t(1));
+    QCOMPARE(ProjectDataManager::partitionsCount().str(), std::string("0"));
+}
+
+void TestProjectDataManager::fileManagerFailures_data()
+{
+    QTest::addColumn<bool>("haveFileManager");
+    QTest::addColumn<int>("line");
+    QTest::addColumn<QString>("text");
+
+    QTest::newRow("no file manager")
+        << false << 187 << "Internal error. Error getting the file manager from theproject\n";
+    QTest::newRow("no file list")
+        << true << 194 << "Internal error. Error getting the files from the file manager\n";
+}
+
+void TestProjectDataManager::fileManagerFailures()
+{
+    QFETCH(bool, haveFileManager);
+    const QString file = m_env->home() + QLatin1String("/broken.orb");
+    QVERIFY(CorvidTest::writeFile(
+        file, projectFile("<property name='PROP_Simulator' value='OSim'/>",
+                          "<file path='a.vhd'/>", "<partition name='/blinky/u1'/>",
+                          "<processProperty name='PROP_MapEffort' value='High'/>")));
+    QVERIFY(OrbProject::openCurrentProject(file));
+
+    CitI::IInterface *service = CitP::InstanceTable::GetInstance(GuiI::IProjectManager::serviceId());
+    QVERIFY(service);
+    Prjrep::AutoRelease<CitI::IInterface> real(
+        static_cast<GuiI::IProjectManager *>(service->GetInterface(GuiI::IProjectManager::iid()))
+            ->getCurrentProject());
+    auto *realProject = static_cast<Dpm::IProject *>(real->GetInterface(Dpm::IProject::iid()));
+    QVERIFY(realProject);
+    auto *broken = new ProjectWithBrokenFiles(realProject, haveFileManager);
+    Prjrep::AutoRelease<Dpm::IProject> brokenReference(broken);
+    ManagerOf manager(broken);
+    CitP::InstanceTable::RegisterInstance(GuiI::IProjectManager::serviceId(), &manager);
+    const QStringList pairs = collectPairs();
+    CitP::InstanceTable::RegisterInstance(GuiI::IProjectManager::serviceId(), service);
+
+    QCOMPARE(pairs, (QStringList{design("PROP_Simulator", "OSim"), partitions(1),
+                                 process("PROP_MapEffort", "High")}));
+    std::vector<Port_MsgManData::Message> errors;
+    for (const Port_MsgManData::Message &m : m_messages) {
+        if (m.kind == Port_MsgManData::Error)
+            errors.push_back(m);
+    }
+    QCOMPARE(errors.size(), std::size_t(1));
+    QCOMPARE(errors[0].module, std::string("CorvidC"));
+    QCOMPARE(errors[0].file, std::string("../s/ProjectDataManager"));
+    QTEST(errors[0].line, "line");
+    QTEST(QString::fromStdString(errors[0].text), "text");
+}
+
+QTEST_GUILESS_MAIN(TestProjectDataManager)
+#include "tst_projectdatamanager.moc"

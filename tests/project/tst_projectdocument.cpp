@@ -1,0 +1,250 @@
+#include "common/TestEnvironment.h"
+
+#include "host/project/ProjectDocument.h"
+
+#include <QtTest>
+
+using OrbProject::ProjectDocument;
+
+// Reading and writing .orb project files.
+class TestProjectDocument : public QObject
+{
+    Q_OBJECT
+private Q_SLOTS:
+    void initTestCase();
+    void readsEveryPart();
+    void refusesBadFiles_data();
+    void refusesBadFiles();
+    void deepNestingIsPassedOver_data();
+    void deepNestingIsPassedOver();
+    void writeThenRead();
+    void effectiveProperties_data();
+    void effectiveProperties();
+
+private:
+    QString path(const QString &name) const { return m_env->home() + QLatin1Char('/') + name; }
+
+    std::unique_ptr<CorvidTest::Environment> m_env;
+};
+
+void TestProjectDocument::initTestCase()
+{
+    m_env.reset(new CorvidTest::Environment);
+}
+
+void TestProjectDocument::readsEveryPart()
+{
+    const QString file = path(QStringLiteral("parts.orb"));
+    QVERIFY(CorvidTest::writeFile(file, R"orb(<?xml version="1.0"?>
+<project name="blinky" version="1">
+  <target family="Xc6" device="xc6a25" package="csg324" speed="-2"/>
+  <properties>
+    <property name="PROP_Synthesis_Tool" value="Synth (VHDL/Verilog)" enabled="false"/>
+    <property name="PROP_UseTraceHint"/>
+    <future-thing><property name="ignored" value="x"/></future-thing>
+  </properties>
+  <sources>
+    <file path="src/top.vhd"/>
+    <file path="src/core.v" type="Verilog"/>
+    <file path="sim/tb.vhd" type="VHDL" association="Simulation"/>
+    <file path="notes.txt"/>
+  </sources>
+  <partitions><partition name="/top/u_core"/></partitions>
+  <processProperties>
+    <processProperty id="synth.goal" name="PROP_Goal" value="Speed" hidden="yes">
+      <filter key="PM" value="Xc6"/>
+      <filter key="PM" value="Xc7"/>
+    </processProperty>
+    <processProperty name="PROP_Constraints" value="top.xcf" file="true" excluded="1"/>
+  </processProperties>
+</project>
+)orb"));
+    ProjectDocument document;
+    QString error;
+    QVERIFY2(document.read(file, &error), qPrintable(error));
+    QCOMPARE(document.name, QStringLiteral("blinky"));
+    QCOMPARE(document.target.device, QStringLiteral("xc6a25"));
+    QCOMPARE(document.target.speed, QStringLiteral("-2"));
+
+    QCOMPARE(document.properties.size(), 2);
+    QCOMPARE(document.properties.at(0).value, QStringLiteral("Synth (VHDL/Verilog)"));
+    QVERIFY(!document.properties.at(0).enabled);
+    QVERIFY(!document.properties.at(1).hasValue);
+
+    QCOMPARE(document.sources.size(), 4);
+    QCOMPARE(document.sources.at(0).type, QStringLiteral("VHDL")); // from the suffix
+    QCOMPARE(document.sources.at(2).association, QStringLiteral("Simulation"));
+    QCOMPARE(document.sources.at(3).type, QString());
+
+    QCOMPARE(document.partitions, QStringList{QStringLiteral("/top/u_core")});
+
+    QCOMPARE(document.processProperties.size(), 2);
+    const ProjectDocument::ProcessProperty &goal = document.processProperties.at(0);
+    QCOMPARE(goal.id, QStringLiteral("synth.goal"));
+    QVERIFY(goal.hidden && !goal.excluded && !goal.fileProperty);
+    QCOMPARE(goal.conditions.size(), 2);
+    QCOMPARE(goal.conditions.at(1).value, QStringLiteral("Xc7"));
+    const ProjectDocument::ProcessProperty &constraints = document.processProperties.at(1);
+    QCOMPARE(constraints.id, QStringLiteral("PROP_Constraints"));
+    QVERIFY(constraints.excluded && constraints.fileProperty);
+}
+
+void TestProjectDocument::refusesBadFiles_data()
+{
+    QTest::addColumn<QByteArray>("contents"); // "-" for no file at all
+    QTest::addColumn<QString>("problem");
+
+    QTest::newRow("missing file") << QByteArray("-") << "no such project file";
+    QTest::newRow("empty file") << QByteArray() << "not a well-formed project file";
+    QTest::newRow("binary") << QByteArray("\x00\x01\xff\xfe garbage", 13) << "not a well-formed";
+    QTest::newRow("unclosed element") << QByteArray("<project><sources>") << "line 1";
+    QTest::newRow("other root") << QByteArray("<workspace/>") << "the root element is <workspace>";
+    QTest::newRow("text only") << QByteArray("just text") << "not a well-formed";
+    QTest::newRow("file without path")
+        << QByteArray("<project><sources><file type='VHDL'/></sources></project>")
+        << "<file> needs a non-empty \"path\" attribute";
+    QTest::newRow("bad flag")
+        << QByteArray("<project><properties><property name='P' enabled='maybe'/></properties></project>")
+        << "attribute \"enabled\" of <property> must be true or false, not \"maybe\"";
+    QTest::newRow("property twice")
+        << QByteArray("<project><properties><property name='P' value='1'/>"
+                      "<property name='P' value='2'/></properties></project>")
+        << "property \"P\" is listed twice";
+    QTest::newRow("filter without key")
+        << QByteArray("<project><processProperties><processProperty name='P'>"
+                      "<filter value='x'/></processProperty></processProperties></project>")
+        << "<filter> needs a non-empty \"key\"";
+}
+
+void TestProjectDocument::refusesBadFiles()
+{
+    QFETCH(QByteArray, contents);
+    QFETCH(QString, problem);
+    const QString file = path(QStringLiteral("bad-%1.orb").arg(QTest::currentDataTag()));
+    if (contents != "-")
+        QVERIFY(CorvidTest::writeFile(file, contents));
+
+    ProjectDocument document;
+    document.name = QStringLiteral("unchanged");
+    QString error;
+    QVERIFY(!document.read(file, &error));
+    QVERIFY2(error.startsWith(file + QLatin1String(": ")), qPrintable(error));
+    QVERIFY2(error.contains(problem), qPrintable(error));
+    QCOMPARE(document.name, QStringLiteral("unchanged"));
+}
+
+void TestProjectDocument::deepNestingIsPassedOver_data()
+{
+    QTest::addColumn<bool>("closed");
+    QTest::newRow("well-formed") << true;
+    QTest::newRow("never closed") << false;
+}
+
+void TestProjectDocument::deepNestingIsPassedOver()
+{
+    QFETCH(bool, closed);
+    const int depth = 200000;
+    QByteArray contents("<project name='deep'><sources><file path='a.vhd'/></sources>");
+    contents.reserve(contents.size() + depth * 8 + 20);
+    for (int i = 0; i < depth; ++i)
+        contents += "<x>";
+    if (closed) {
+        for (int i = 0; i < depth; ++i)
+            contents += "</x>";
+        contents += "</project>";
+    }
+    const QString file = path(QStringLiteral("deep.orb"));
+    QVERIFY(CorvidTest::writeFile(file, contents));
+
+    ProjectDocument document;
+    QString error;
+    QCOMPARE(document.read(file, &error), closed);
+    if (closed)
+        QCOMPARE(document.sources.size(), 1);
+    else
+        QVERIFY2(error.contains(QLatin1String("not a well-formed")), qPrintable(error));
+}
+
+void TestProjectDocument::writeThenRead()
+{
+    ProjectDocument written;
+    written.name = QStringLiteral("ledctrl & co");
+    written.target = {QStringLiteral("Xc6"), QStringLiteral("xc6a25"), QStringLiteral("csg324"),
+                      QStringLiteral("-2")};
+    written.properties.append({QStringLiteral("PROP_Simulator"), QStringLiteral("<sim>"), true, false});
+    written.properties.append({QStringLiteral("PROP_UseTraceHint"), QString(), false, true});
+    written.sources.append({QStringLiteral("src/a b.vhd"), QStringLiteral("VHDL"), QString()});
+    written.sources.append({QStringLiteral("tb.v"), QStringLiteral("Verilog"), QStringLiteral("Sim")});
+    written.partitions = QStringList{QStringLiteral("/top"), QStringLiteral("/top/u1")};
+    ProjectDocument::ProcessProperty process;
+    process.id = QStringLiteral("id.1");
+    process.name = QStringLiteral("PROP_File");
+    process.value = QStringLiteral("x\"y'z");
+    process.hasValue = true;
+    process.fileProperty = true;
+    process.hidden = true;
+    process.conditions.append({QStringLiteral("DEVICE"), QStringLiteral("xc6a25")});
+    written.processProperties.append(process);
+
+    const QString file = path(QStringLiteral("written.orb"));
+    QString error;
+    QVERIFY2(written.write(file, &error), qPrintable(error));
+    ProjectDocument read;
+    QVERIFY2(read.read(file, &error), qPrintable(error));
+
+    QCOMPARE(read.name, written.name);
+    QCOMPARE(read.target.package, written.target.package);
+    QCOMPARE(read.properties.size(), 2);
+    QCOMPARE(read.properties.at(0).value, QStringLiteral("<sim>"));
+    QVERIFY(!read.properties.at(0).enabled);
+    QVERIFY(!read.properties.at(1).hasValue);
+    QCOMPARE(read.sources.at(1).association, QStringLiteral("Sim"));
+    QCOMPARE(read.partitions, written.partitions);
+    const ProjectDocument::ProcessProperty &back = read.processProperties.value(0);
+    QCOMPARE(back.id, process.id);
+    QCOMPARE(back.value, process.value);
+    QVERIFY(back.fileProperty && back.hidden && !back.excluded);
+    QCOMPARE(back.conditions.value(0).key, QStringLiteral("DEVICE"));
+
+    QVERIFY(!written.write(path(QStringLiteral("no/such/dir/x.orb")), &error));
+    QVERIFY2(error.contains(QLatin1String("cannot be written")), qPrintable(error));
+}
+
+void TestProjectDocument::effectiveProperties_data()
+{
+    QTest::addColumn<QString>("device");
+    QTest::addColumn<QString>("listedDevice"); // empty: not listed
+    QTest::addColumn<QStringList>("expected"); // name=value
+
+    QTest::newRow("derived from the target")
+        << "xc6a25" << QString()
+        << QStringList{"PROP_DevFamily=Xc6", "PROP_DevFamilyPMName=Xc6", "PROP_DevDevice=xc6a25",
+                       "PROP_Simulator=OSim"};
+    QTest::newRow("a listed property wins")
+        << "xc6a25" << "xc6a50"
+        << QStringList{"PROP_DevFamily=Xc6", "PROP_DevFamilyPMName=Xc6", "PROP_Simulator=OSim",
+                       "PROP_DevDevice=xc6a50"};
+    QTest::newRow("empty target values give nothing")
+        << QString() << QString()
+        << QStringList{"PROP_DevFamily=Xc6", "PROP_DevFamilyPMName=Xc6", "PROP_Simulator=OSim"};
+}
+
+void TestProjectDocument::effectiveProperties()
+{
+    QFETCH(QString, device);
+    QFETCH(QString, listedDevice);
+    QFETCH(QStringList, expected);
+    ProjectDocument document;
+    document.target.family = QStringLiteral("Xc6");
+    document.target.device = device;
+    document.properties.append({QStringLiteral("PROP_Simulator"), QStringLiteral("OSim"), true, true});
+    if (!listedDevice.isEmpty())
+        document.properties.append({QStringLiteral("PROP_DevDevice"), listedDevice, true, true});
+    QStringList actual;
+    for (const ProjectDocument::DesignProperty &property : document.effectiveProperties())
+        actual << property.name + QLatin1Char('=') + property.value;
+    QCOMPARE(actual, expected);
+}
+
+QTEST_GUILESS_MAIN(TestProjectDocument)
+#include "tst_projectdocument.moc"
