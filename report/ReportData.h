@@ -4,6 +4,7 @@
 #include <QMap>
 #include <QPair>
 #include <QString>
+#include <QStringBuilder>
 #include <QStringList>
 
 // The fields one report build fills and reads. Owned by the report builder;
@@ -39,3 +40,28 @@ struct CrvC_ReportData
     // Send iteration shown in the report; computed once per build.
     QString projectIteration;
 };
+
+// The dtag mark-up that the tables share: a group is its head line, the list
+// line of its items (left out for empty lists) and its closing line.
+namespace CrvC_Markup {
+
+// <dtag-group><dtag-group-name name="NAME">NAME</dtag-group-name>
+inline QString groupHead(const QString &name)
+{
+    return QLatin1String("<dtag-group><dtag-group-name name=\"") % name % QLatin1String("\">")
+        % name % QLatin1String("</dtag-group-name>");
+}
+
+// <UL>, one <LI> per item, </UL>, on lines of their own.
+inline QString itemList(const QStringList &items)
+{
+    return QLatin1String("<UL>\n<LI>") % items.join(QLatin1String("</LI>\n<LI>"))
+        % QLatin1String("</LI>\n</UL>");
+}
+
+inline QString groupEnd()
+{
+    return QStringLiteral("</dtag-group>");
+}
+
+} // namespace CrvC_Markup

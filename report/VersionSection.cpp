@@ -1,13 +1,133 @@
 #include "VersionSection.h"
 
-QString CrvC_VersionSection::versionSection(CrvC_ReportData &, const CrvC_ReportBuilder::Environment &)
+#include "host/Env.h"
+#include "host/String.h"
+#include "host/Version.h"
+#include "plugin/CorvidSettings.h"
+#include "project/ProjectRepositoryValues.h"
+
+#include <QFile>
+
+namespace {
+
+QString versionValue(const char *key)
 {
-    return QString();
+    return Gui::Clip::String::convert(Port::Version::getValue(key));
+}
+
+bool projectFileExists(const CrvC_ReportData &data)
+{
+    return !data.projectFile.isEmpty() && QFile::exists(data.projectFile);
+}
+
+QString repositoryValue(const CrvC_ReportData &data, const char *key)
+{
+    return ProjectRepositoryValues::instance().getValue(data.projectFile,
+                                                        QString::fromLatin1(key));
+}
+
+} // namespace
+
+QString CrvC_VersionSection::productConfigurationLabel(const QString &targetDevice)
+{
+    return Gui::Clip::String::convert(
+        Port::UserInformation::getProductConfigurationLabel(targetDevice.toUtf8().constData()));
+}
+
+QString CrvC_VersionSection::platformName()
+{
+    return Gui::Clip::String::convert(Port_Env::GetPlatformPath()).toUpper();
+}
+
+QString CrvC_VersionSection::reportRegistrationId()
+{
+    const QString text = Gui::Clip::String::convert(Port::UserInformation::getRegistrationText());
+    if (text.isEmpty() || text == QLatin1String(Port::UserInformation::NoInformationText))
+        return versionValue("Registration_ID");
+    return text;
+}
+
+QString CrvC_VersionSection::projectId(const CrvC_ReportData &data,
+                                       const CrvC_ReportBuilder::Environment &environment)
+{
+    const QString fresh = environment.newIdentifier ? environment.newIdentifier()
+                                                    : CrvC_Settings::newIdentifier();
+    if (!projectFileExists(data))
+        return fresh;
+    const QString stored = repositoryValue(data, ProjectRepositoryValues::ProjectIdKey);
+    if (!stored.isEmpty())
+        return stored;
+    ProjectRepositoryValues::instance().setValue(
+        data.projectFile, QString::fromLatin1(ProjectRepositoryValues::ProjectIdKey), fresh);
+    return fresh;
 }
 
 QString CrvC_VersionSection::projectIteration(CrvC_ReportData &data)
 {
-    if (data.projectIteration.isEmpty())
-        data.projectIteration = QStringLiteral("1");
+    if (!data.projectIteration.isEmpty())
+        return data.projectIteration;
+    data.projectIteration = QStringLiteral("1");
+    if (projectFileExists(data)) {
+        const QString stored = repositoryValue(data, ProjectRepositoryValues::SendIterationKey);
+        bool ok = false;
+        const int iteration = stored.toInt(&ok, 10);
+        if (ok)
+            data.projectIteration = QString::number(iteration);
+    }
     return data.projectIteration;
+}
+
+QString CrvC_VersionSection::versionSection(CrvC_ReportData &data,
+                                            const CrvC_ReportBuilder::Environment &environment)
+{
+    const QString product = versionValue("product");
+    const QString version = versionValue("version");
+    const QString registrationId = reportRegistrationId();
+    const QString platform = platformName();
+    const QString label = productConfigurationLabel(data.targetDevice);
+
+    // Computed in this order: random, project, iteration.
+    const QString random = CrvC_Settings::randomId();
+    const QString project = projectId(data, environment);
+    const QString iteration = projectIteration(data);
+
+    const QDateTime now = environment.now ? environment.now() : QDateTime::currentDateTime();
+
+    static const QLatin1String rowStart("<TR ALIGN=LEFT>");
+    static const QLatin1String rowEnd("</TR>");
+    static const QLatin1String valueEnd("</dtag-property></TD>");
+    const auto labelCell = [](const char *text) -> QString {
+        return QLatin1String("<TD BGCOLOR='#FFFF99'><B>") % QLatin1String(text)
+            % QLatin1String("</B></TD>");
+    };
+    const auto value = [](const char *name, const QString &text) -> QString {
+        return QLatin1String("<TD><dtag-property name=\"") % QLatin1String(name)
+            % QLatin1String("\">") % text % valueEnd;
+    };
+
+    QStringList lines;
+    lines.reserve(31);
+    lines << QStringLiteral("<TABLE BORDER CELLSPACING=0 WIDTH='100%'>")
+          << QStringLiteral("<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN='4'><B>Software "
+                            "Version and Target Device</B></TD></TR>");
+    lines << rowStart << labelCell("Product Version:")
+          << QLatin1String("<TD><dtag-property name=\"ProductVersion\">") % product
+                 % QLatin1Char(':') % version
+                 % QLatin1String("</dtag-property><dtag-property name=\"ProductConfiguration\"> (")
+                 % label % QLatin1Char(')') % valueEnd
+          << labelCell("Target Family:") << value("TargetFamily", data.targetFamily) << rowEnd;
+    lines << rowStart << labelCell("OS Platform:") << value("OSPlatform", platform)
+          << labelCell("Target Device:") << value("TargetDevice", data.targetDevice) << rowEnd;
+    lines << rowStart << labelCell("Project ID (random number)")
+          << QLatin1String("<TD><dtag-property name=\"RandomID\">") % random
+                 % QLatin1String("</dtag-property>.<dtag-property name=\"ProjectID\">") % project
+                 % QLatin1String("</dtag-property>.<dtag-property name=\"ProjectIteration\">")
+                 % iteration % valueEnd
+          << labelCell("Target Package:") << value("TargetPackage", data.targetPackage) << rowEnd;
+    lines << rowStart << labelCell("Registration ID") << value("RegistrationID", registrationId)
+          << labelCell("Target Speed:") << value("TargetSpeed", data.targetSpeed) << rowEnd;
+    lines << rowStart << labelCell("Date Generated")
+          << value("Date Generated", now.toString(Qt::TextDate)) << rowEnd;
+    lines << QStringLiteral("</TABLE>");
+    return lines.join(QLatin1Char('\n'));
 }

@@ -1,0 +1,179 @@
+#include "common/TestEnvironment.h"
+#include "plugin/CorvidSettings.h"
+#include "report/ReportBuilder.h"
+#include "report/UsageXml.h"
+#include "report/VersionSection.h"
+
+#include <QDir>
+#include <QTemporaryDir>
+#include <QtTest>
+
+namespace {
+
+const QString PageHead = QStringLiteral(
+    "<HTML><HEAD><TITLE>Device Usage Statistics Report</TITLE></HEAD>\n"
+    "<BODY TEXT='#000000' BGCOLOR='#FFFFFF' LINK='#0000EE' VLINK='#551A8B' ALINK='#FF0000'>\n"
+    "<H3>Device Usage Page (device_usage_statistics.html)</H3>This HTML page displays the device "
+    "usage statistics that will be sent to Vantor. The file also contains predefined XML tags used "
+    "to simplify processing.<BR>&nbsp;<BR>Please verify the contents are okay to send to "
+    "Vantor!<BR>&nbsp;<BR><HR>&nbsp;<BR>\n");
+
+const QString EmptyDeviceTable = QStringLiteral(
+    "&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
+    "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=4><B>Device Usage Statistics</B></TD></TR>\n"
+    "<TR ALIGN=CENTER BGCOLOR='#FFFF99'><TD><B>Macro Statistics</B></TD><TD><B>Miscellaneous "
+    "Statistics</B></TD><TD><B>Net Statistics</B></TD><TD><B>Site Usage</B></TD></TR>"
+    "<TR VALIGN=TOP>\n"
+    "<TD>&nbsp;</TD>\n<TD>&nbsp;</TD><TD>&nbsp;</TD>\n<TD>&nbsp;</TD>\n</TR></TABLE>\n");
+
+CrvC_ReportBuilder::Environment environment(int *asked = nullptr, bool answer = false,
+                                            const QString &typed = QString(),
+                                            QStringList *busy = nullptr)
+{
+    CrvC_ReportBuilder::Environment env;
+    env.now = [] { return QDateTime(QDate(2009, 3, 17), QTime(14, 5, 9)); };
+    env.newIdentifier = [] { return QStringLiteral("0123456789abcdef0123456789abcdef"); };
+    env.askDesignName = [asked, answer, typed](QString &name) {
+        if (asked)
+            ++*asked;
+        name = typed;
+        return answer;
+    };
+    env.setBusy = [busy](bool on) {
+        if (busy)
+            *busy << (on ? QStringLiteral("busy") : QStringLiteral("idle"));
+    };
+    return env;
+}
+
+} // namespace
+
+class tst_ReportBuilder : public QObject
+{
+    Q_OBJECT
+
+private:
+    std::unique_ptr<CorvidTest::Environment> m_env;
+    std::unique_ptr<QTemporaryDir> m_dir;
+    QString m_oldCurrent;
+
+private Q_SLOTS:
+    void initTestCase()
+    {
+        m_env.reset(new CorvidTest::Environment);
+        m_oldCurrent = QDir::currentPath();
+    }
+
+    // Every test builds in an empty working directory of its own: without a
+    // project the builder reads and writes there.
+    void init()
+    {
+        m_dir.reset(new QTemporaryDir);
+        QVERIFY(QDir::setCurrent(m_dir->path()));
+        CrvC_Settings::setValue(CrvC_Settings::RandomID,
+                                QStringLiteral("fedcba9876543210fedcba9876543210"));
+    }
+
+    void cleanup() { QDir::setCurrent(m_oldCurrent); }
+
+    void projectFileExtension_data()
+    {
+        QTest::addColumn<QString>("given");
+        QTest::addColumn<QString>("used");
+        QTest::newRow("upper-case extension kept") << "C:/work/top.ORB" << "C:/work/top.ORB";
+        QTest::newRow("lower-case extension kept") << "C:/work/top.orb" << "C:/work/top.orb";
+        QTest::newRow("extension appended") << "C:/work/top" << "C:/work/top.orb";
+        QTest::newRow("only a final extension counts") << "C:/work/top.orb.bak"
+                                                       << "C:/work/top.orb.bak.orb";
+        QTest::newRow("empty") << "" << ".orb";
+    }
+
+    void projectFileExtension()
+    {
+        QFETCH(QString, given);
+        QFETCH(QString, used);
+        CrvC_ReportBuilder builder(environment());
+        builder.createReport(given, QStringLiteral("top"), QStringLiteral("Xc6"));
+        QCOMPARE(builder.data().projectFile, used);
+        QCOMPARE(builder.data().targetFamily, QStringLiteral("Xc6"));
+    }
+
+    void designName_data()
+    {
+        QTest::addColumn<QString>("given");
+        QTest::addColumn<bool>("accept");
+        QTest::addColumn<QString>("typed");
+        QTest::addColumn<int>("asked");
+        QTest::addColumn<QString>("device"); // tells which map report was read
+
+        QTest::newRow("caller's name used with its blanks") << "  top  " << true << "other" << 0
+                                                            << "untrimmed";
+        QTest::newRow("typed name trimmed") << "" << true << "  top  " << 1 << "trimmed";
+        QTest::newRow("cancelled: empty name") << "" << false << "top" << 1 << "nameless";
+    }
+
+    void designName()
+    {
+        QFETCH(QString, given);
+        QFETCH(bool, accept);
+        QFETCH(QString, typed);
+        QFETCH(int, asked);
+        QFETCH(QString, device);
+        CorvidTest::writeFile(QStringLiteral("top_map.ktp"), "Target Device : trimmed\n");
+        CorvidTest::writeFile(QStringLiteral("  top  _map.ktp"), "Target Device : untrimmed\n");
+        CorvidTest::writeFile(QStringLiteral("_map.ktp"), "Target Device : nameless\n");
+        int count = 0;
+        CrvC_ReportBuilder builder(environment(&count, accept, typed));
+        builder.createReport(QStringLiteral("top.orb"), given, QString());
+        QCOMPARE(count, asked);
+        QCOMPARE(builder.data().targetDevice, device);
+    }
+
+    void noInputFiles()
+    {
+        QStringList busy;
+        CrvC_ReportBuilder builder(environment(nullptr, false, QString(), &busy));
+        builder.createReport(QStringLiteral("top"), QStringLiteral("top"), QStringLiteral("Xc6"));
+        QCOMPARE(busy, QStringList({"busy", "idle"}));
+
+        CrvC_ReportData copy = builder.data();
+        const QString expected = PageHead
+            + CrvC_VersionSection::versionSection(copy, builder.environment())
+            + QLatin1Char('\n') + EmptyDeviceTable;
+        const QString page = builder.pageText();
+        QCOMPARE(page.left(expected.size()), expected);
+        QVERIFY(!page.contains(QLatin1String("Configuration Data")));
+        QVERIFY(!page.contains(QLatin1String("Pin Data")));
+        QVERIFY(page.endsWith(QLatin1String("\n</BODY></HTML>")));
+
+        QVERIFY(builder.written());
+        QCOMPARE(QDir::current().absoluteFilePath(builder.data().reportPath),
+                 m_dir->filePath(QStringLiteral("device_usage_statistics.html")));
+        QCOMPARE(CorvidTest::readFile(builder.data().reportPath), page.toUtf8());
+    }
+
+    void exampleDesign()
+    {
+        const QString source = CorvidTest::Environment::sourceDir() + QLatin1String("/examples/ledctrl/");
+        for (const char *name : {"ledctrl.snx", "ledctrl_map.ktp", "ledctrl_usage.xml"})
+            QVERIFY(QFile::copy(source + QLatin1String(name), QLatin1String(name)));
+
+        CrvC_ReportBuilder builder(environment());
+        builder.createReport(QStringLiteral("ledctrl.orb"), QStringLiteral("ledctrl"),
+                             QStringLiteral("Xc6"));
+        QCOMPARE(builder.data().targetDevice, QStringLiteral("xc6a25"));
+
+        QStringList lines;
+        CrvC_UsageXml::appendTables(builder.data(), lines);
+        const QString tables = lines.join(QLatin1Char('\n'));
+        const QString expected = QString::fromUtf8(CorvidTest::readFile(
+            QStringLiteral(CORVID_SOURCE_DIR "/tests/reporttables/ledctrl_tables.html")));
+        QCOMPARE(tables + QLatin1Char('\n'), expected);
+        QVERIFY(builder.pageText().contains(QLatin1String("\n") + tables + QLatin1String("\n")));
+        QVERIFY(builder.pageText().contains(QLatin1String(
+            "<dtag-property name=\"ProductConfiguration\"> (Professional)</dtag-property>")));
+    }
+};
+
+QTEST_GUILESS_MAIN(tst_ReportBuilder)
+#include "tst_reportbuilder.moc"
