@@ -274,7 +274,7 @@ bool CrvC_UsageXml::readUsageXml(const QString &path, CrvC_ReportData &data)
 {
     data.usageXmlPath = path;
     QFile file(path);
-    if (!file.open(QIODevice::ReadOnly))
+    if (!file.open(QIODevice::ReadOnly) || file.size() > CrvC_XmlDepthGuard::MaxFileSize)
         return false;
 
     // Filled on the side: a document that turns out to be malformed, or

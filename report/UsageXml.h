@@ -9,7 +9,10 @@ class CrvC_UsageXml
 {
 public:
     // Fills the four section tables and the item counters; false when the file
-    // is missing, unreadable or malformed (the tables then stay empty).
+    // is missing, unreadable or malformed, or larger or nested deeper than
+    // CrvC_XmlDepthGuard allows (the tables are then left as they were).
+    // Reads the file as a stream, in one pass. Groups inside groups are
+    // stored under their own names, each with its own items.
     static bool readUsageXml(const QString &path, CrvC_ReportData &data);
     // Appends the report lines of the three tables (the last two only when
     // they have groups).
