@@ -66,7 +66,8 @@ bool CrvC_SynthesisReport::readMacroStatistics(const QString &path, CrvC_ReportD
         } else if (!line.isEmpty() && inCategory) {
             QString item = line.simplified();
             item.replace(separator, equals);
-            data.macroStatistics.last().second.append(QLatin1String("<dtag-item1>") % item % QLatin1String("</dtag-item1>"));
+            data.macroStatistics.last().second.append(QLatin1String("<dtag-item1>") % item
+                                                      % QLatin1String("</dtag-item1>"));
         }
     }
     return true;

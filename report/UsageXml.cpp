@@ -320,7 +320,8 @@ void CrvC_UsageXml::appendTables(const CrvC_ReportData &data, QStringList &lines
     if (data.designStatistics.isEmpty()) {
         lines << QStringLiteral("<TD>&nbsp;</TD><TD>&nbsp;</TD>");
     } else {
-        lines << QStringLiteral("<dtag-section name=\"DesignStatistics\">") << QStringLiteral("<TD>");
+        lines << QStringLiteral("<dtag-section name=\"DesignStatistics\">")
+              << QStringLiteral("<TD>");
         for (auto it = data.designStatistics.cbegin(); it != data.designStatistics.cend(); ++it) {
             if (it.key().startsWith(QLatin1String("NetStatistics"), Qt::CaseInsensitive))
                 lines << CellBreak;

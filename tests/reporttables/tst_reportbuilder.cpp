@@ -154,7 +154,8 @@ private Q_SLOTS:
 
     void exampleDesign()
     {
-        const QString source = CorvidTest::Environment::sourceDir() + QLatin1String("/examples/ledctrl/");
+        const QString source =
+            CorvidTest::Environment::sourceDir() + QLatin1String("/examples/ledctrl/");
         for (const char *name : {"ledctrl.snx", "ledctrl_map.ktp", "ledctrl_usage.xml"})
             QVERIFY(QFile::copy(source + QLatin1String(name), QLatin1String(name)));
 

@@ -56,21 +56,23 @@ private Q_SLOTS:
         QTest::addColumn<QString>("package");
         QTest::addColumn<QString>("speed");
 
-        QTest::newRow("header lines") << QByteArray("Release 14.7 Map\n\nTarget Device  : xc6a25\n"
-                                                    "Target Package : csg324\nTarget Speed   : -2\n")
-                                      << "xc6a25" << "csg324" << "-2";
-        QTest::newRow("CRLF line ends") << QByteArray("Target Device : xc6a25\r\nTarget Speed : -2\r\n")
-                                        << "xc6a25" << "" << "-2";
-        QTest::newRow("lower case prefix taken") << QByteArray("target device : x\n") << "x" << ""
-                                                 << "";
+        QTest::newRow("header lines")
+            << QByteArray("Release 14.7 Map\n\nTarget Device  : xc6a25\n"
+                          "Target Package : csg324\nTarget Speed   : -2\n")
+            << "xc6a25" << "csg324" << "-2";
+        QTest::newRow("CRLF line ends")
+            << QByteArray("Target Device : xc6a25\r\nTarget Speed : -2\r\n") << "xc6a25" << ""
+            << "-2";
+        QTest::newRow("lower case prefix taken") << QByteArray("target device : x\n") << "x"
+                                                 << "" << "";
         QTest::newRow("leading blank not taken") << QByteArray("  Target Device : x\n") << ""
                                                  << "" << "";
-        QTest::newRow("second colon ends the value") << QByteArray("Target Device : a : b\n") << "a"
-                                                     << "" << "";
-        QTest::newRow("no colon gives empty") << QByteArray("Target Device xc6a25\n") << "" << ""
-                                              << "";
-        QTest::newRow("later line wins") << QByteArray("Target Speed : -1\nTarget Speed : -3\n") << ""
-                                         << "" << "-3";
+        QTest::newRow("second colon ends the value") << QByteArray("Target Device : a : b\n")
+                                                     << "a" << "" << "";
+        QTest::newRow("no colon gives empty") << QByteArray("Target Device xc6a25\n") << ""
+                                              << "" << "";
+        QTest::newRow("later line wins") << QByteArray("Target Speed : -1\nTarget Speed : -3\n")
+                                         << "" << "" << "-3";
         QByteArray late(19, '\n');
         late += "Target Package : line20\nTarget Device : line21\n";
         QTest::newRow("only the first 20 lines") << late << "" << "line20" << "";
@@ -162,25 +164,6 @@ private Q_SLOTS:
         CrvC_ReportData data;
         QVERIFY(CrvC_SynthesisReport::readMacroStatistics(write(contents), data));
         QCOMPARE(CrvC_SynthesisReport::macroStatisticsCell(data), cell);
-    }
-
-    void exampleDesign()
-    {
-        const QString dir = CorvidTest::Environment::sourceDir() + QLatin1String("/examples/ledctrl/");
-        CrvC_ReportData data;
-        CrvC_SynthesisReport::readTargetInfo(dir + QLatin1String("ledctrl_map.ktp"), data);
-        CrvC_SynthesisReport::readMacroStatistics(dir + QLatin1String("ledctrl.snx"), data);
-        QCOMPARE(data.targetDevice, QStringLiteral("xc6a25"));
-        QCOMPARE(data.targetPackage, QStringLiteral("csg324"));
-        QCOMPARE(data.targetSpeed, QStringLiteral("-2"));
-        QStringList names;
-        for (const auto &entry : data.macroStatistics)
-            names << entry.first;
-        QCOMPARE(names, QStringList({" RAMs=1", " Counters=2", " Registers=42", " Comparators=4",
-                                     " Multiplexers=1", " FSMs=1"}));
-        QCOMPARE(data.macroStatistics.at(1).second,
-                 QStringList({"<dtag-item1>10-bit up counter=1</dtag-item1>",
-                              "<dtag-item1>24-bit up counter=1</dtag-item1>"}));
     }
 };
 

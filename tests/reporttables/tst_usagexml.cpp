@@ -20,7 +20,9 @@ QString dump(const CrvC_ReportData &data)
     add("device", data.deviceUsage);
     add("config", data.reportConfigData);
     add("pin", data.reportPinData);
-    lines << QStringLiteral("counts %1 %2").arg(data.reportConfigDataCount).arg(data.reportPinDataCount);
+    lines << QStringLiteral("counts %1 %2")
+                 .arg(data.reportConfigDataCount)
+                 .arg(data.reportPinDataCount);
     return lines.join(QLatin1Char('\n'));
 }
 
@@ -136,8 +138,9 @@ private Q_SLOTS:
             << doc("<DeviceUsage><group name='g'><item name='n'>text<Attrib name='a' value='1'/>"
                    "<note name='b' value='2'/></item></group></DeviceUsage>")
             << "device/g: <dtag-item1>n=</dtag-item1>\ncounts 0 0";
-        QTest::newRow("item without attributes") << doc("<DeviceUsage><group><item/></group></DeviceUsage>")
-                                                 << "device/: <dtag-item1>=</dtag-item1>\ncounts 0 0";
+        QTest::newRow("item without attributes")
+            << doc("<DeviceUsage><group><item/></group></DeviceUsage>")
+            << "device/: <dtag-item1>=</dtag-item1>\ncounts 0 0";
         QTest::newRow("other case is walked, not taken")
             << doc("<DeviceUsage><Group name='G'><group name='g'><Item name='I'><item name='n' "
                    "value='1'/></Item></group></Group></DeviceUsage>")
@@ -232,6 +235,19 @@ private Q_SLOTS:
         QVERIFY(!CrvC_UsageXml::readUsageXml(path, data));
         QCOMPARE(dump(data), QStringLiteral("counts 0 0"));
         QCOMPARE(tables(data), EmptyTables);
+    }
+
+    void failedReadKeepsTables()
+    {
+        // The groups before the error are complete, yet nothing of the
+        // broken document is kept.
+        CrvC_ReportData data;
+        data.deviceUsage.insert(QStringLiteral("old"), items(1));
+        QVERIFY(!CrvC_UsageXml::readUsageXml(
+            write("<r><ReportConfigData><group name='g'><item name='a' value='1'/></group>"
+                  "<group name='h'><item name='b' value='2'/></group><oops></r>"),
+            data));
+        QCOMPARE(dump(data), QStringLiteral("device/old: <dtag-item1>i0=0</dtag-item1>\ncounts 0 0"));
     }
 
     void deepButAcceptedNesting()
@@ -337,23 +353,6 @@ private Q_SLOTS:
         QCOMPARE(tables(data), EmptyTables + QLatin1Char('\n')
                                    + spreadTable(QStringLiteral("Pin Data"),
                                                  head("p") + list(items(1)) + Break + End));
-    }
-
-    void exampleDesign()
-    {
-        const QString path = CorvidTest::Environment::sourceDir()
-            + QLatin1String("/examples/ledctrl/ledctrl_usage.xml");
-        CrvC_ReportData data;
-        QVERIFY(CrvC_UsageXml::readUsageXml(path, data));
-        QCOMPARE(data.designStatistics.keys(),
-                 QStringList({"Miscellaneous", "NetStatistics", "NetStatisticsClock"}));
-        QCOMPARE(data.deviceUsage.value(QStringLiteral("SliceLogic")),
-                 QStringList({"<dtag-item3>LUT=[fixed:2] [routed:55]</dtag-item3>",
-                              "<dtag-item1>FlipFlop=42</dtag-item1>"}));
-        QCOMPARE(data.reportConfigDataCount, 8);
-        QCOMPARE(data.reportPinDataCount, 7);
-        const QString page = tables(data);
-        QCOMPARE(page.count(QLatin1Char('\n') + Break), 2 + 3 + 3);
     }
 
     void largeDocumentIsLinear()

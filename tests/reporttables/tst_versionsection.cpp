@@ -10,63 +10,40 @@
 
 namespace {
 
-struct Values
-{
-    QString product, config, family, platform, device, ids, package, registration, speed, date;
-};
-
-QString versionTable(const Values &v)
-{
-    return QLatin1String(
-               "<TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
-               "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN='4'><B>Software Version and Target "
-               "Device</B></TD></TR>\n"
-               "<TR ALIGN=LEFT>\n"
-               "<TD BGCOLOR='#FFFF99'><B>Product Version:</B></TD>\n"
-               "<TD><dtag-property name=\"ProductVersion\">")
-        + v.product + QLatin1String("</dtag-property><dtag-property name=\"ProductConfiguration\"> (")
-        + v.config
-        + QLatin1String(")</dtag-property></TD>\n"
-                        "<TD BGCOLOR='#FFFF99'><B>Target Family:</B></TD>\n"
-                        "<TD><dtag-property name=\"TargetFamily\">")
-        + v.family
-        + QLatin1String("</dtag-property></TD>\n"
-                        "</TR>\n"
-                        "<TR ALIGN=LEFT>\n"
-                        "<TD BGCOLOR='#FFFF99'><B>OS Platform:</B></TD>\n"
-                        "<TD><dtag-property name=\"OSPlatform\">")
-        + v.platform
-        + QLatin1String("</dtag-property></TD>\n"
-                        "<TD BGCOLOR='#FFFF99'><B>Target Device:</B></TD>\n"
-                        "<TD><dtag-property name=\"TargetDevice\">")
-        + v.device
-        + QLatin1String("</dtag-property></TD>\n"
-                        "</TR>\n"
-                        "<TR ALIGN=LEFT>\n"
-                        "<TD BGCOLOR='#FFFF99'><B>Project ID (random number)</B></TD>\n"
-                        "<TD>")
-        + v.ids
-        + QLatin1String("</TD>\n"
-                        "<TD BGCOLOR='#FFFF99'><B>Target Package:</B></TD>\n"
-                        "<TD><dtag-property name=\"TargetPackage\">")
-        + v.package
-        + QLatin1String("</dtag-property></TD>\n"
-                        "</TR>\n"
-                        "<TR ALIGN=LEFT>\n"
-                        "<TD BGCOLOR='#FFFF99'><B>Registration ID</B></TD>\n"
-                        "<TD><dtag-property name=\"RegistrationID\">")
-        + v.registration
-        + QLatin1String("</dtag-property></TD>\n"
-                        "<TD BGCOLOR='#FFFF99'><B>Target Speed:</B></TD>\n"
-                        "<TD><dtag-property name=\"TargetSpeed\">")
-        + v.speed
-        + QLatin1String("</dtag-property></TD>\n"
-                        "</TR>\n"
-                        "<TR ALIGN=LEFT>\n"
-                        "<TD BGCOLOR='#FFFF99'><B>Date Generated</B></TD>\n"
-                        "<TD><dtag-property name=\"Date Generated\">")
-        + v.date + QLatin1String("</dtag-property></TD>\n</TR>\n</TABLE>");
-}
+// The table with %1 product:version, %2 configuration label, %3 family,
+// %4 platform, %5 device, %6 identifiers, %7 package, %8 registration,
+// %9 speed, %10 date.
+const char *const VersionTable = R"(<TABLE BORDER CELLSPACING=0 WIDTH='100%'>
+<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN='4'><B>Software Version and Target Device</B></TD></TR>
+<TR ALIGN=LEFT>
+<TD BGCOLOR='#FFFF99'><B>Product Version:</B></TD>
+<TD><dtag-property name="ProductVersion">%1</dtag-property><dtag-property name="ProductConfiguration"> (%2)</dtag-property></TD>
+<TD BGCOLOR='#FFFF99'><B>Target Family:</B></TD>
+<TD><dtag-property name="TargetFamily">%3</dtag-property></TD>
+</TR>
+<TR ALIGN=LEFT>
+<TD BGCOLOR='#FFFF99'><B>OS Platform:</B></TD>
+<TD><dtag-property name="OSPlatform">%4</dtag-property></TD>
+<TD BGCOLOR='#FFFF99'><B>Target Device:</B></TD>
+<TD><dtag-property name="TargetDevice">%5</dtag-property></TD>
+</TR>
+<TR ALIGN=LEFT>
+<TD BGCOLOR='#FFFF99'><B>Project ID (random number)</B></TD>
+<TD>%6</TD>
+<TD BGCOLOR='#FFFF99'><B>Target Package:</B></TD>
+<TD><dtag-property name="TargetPackage">%7</dtag-property></TD>
+</TR>
+<TR ALIGN=LEFT>
+<TD BGCOLOR='#FFFF99'><B>Registration ID</B></TD>
+<TD><dtag-property name="RegistrationID">%8</dtag-property></TD>
+<TD BGCOLOR='#FFFF99'><B>Target Speed:</B></TD>
+<TD><dtag-property name="TargetSpeed">%9</dtag-property></TD>
+</TR>
+<TR ALIGN=LEFT>
+<TD BGCOLOR='#FFFF99'><B>Date Generated</B></TD>
+<TD><dtag-property name="Date Generated">%10</dtag-property></TD>
+</TR>
+</TABLE>)";
 
 QString ids(const QString &random, const QString &project, const QString &iteration)
 {
@@ -138,7 +115,8 @@ private Q_SLOTS:
     void init()
     {
         m_env->clearSettings();
-        CrvC_Settings::setValue(CrvC_Settings::RandomID, QStringLiteral("fedcba9876543210fedcba9876543210"));
+        CrvC_Settings::setValue(CrvC_Settings::RandomID,
+                                QStringLiteral("fedcba9876543210fedcba9876543210"));
     }
 
     void table_data()
@@ -175,19 +153,17 @@ private Q_SLOTS:
         data.targetSpeed = QStringLiteral("-2");
         data.projectFile = m_dir.filePath(QStringLiteral("absent.orb"));
 
-        Values v;
-        v.product = QStringLiteral("Orb Design Suite:14.7");
-        v.config = config;
-        v.family = family;
-        v.platform = sizeof(void *) == 8 ? QStringLiteral("LIN64") : QStringLiteral("LIN");
-        v.device = device;
-        v.ids = ids(QStringLiteral("fedcba9876543210fedcba9876543210"),
-                    QStringLiteral("0123456789abcdef0123456789abcdef"), QStringLiteral("1"));
-        v.package = QStringLiteral("csg324");
-        v.registration = registration;
-        v.speed = QStringLiteral("-2");
-        v.date = QStringLiteral("Tue Mar 17 14:05:09 2009");
-        QCOMPARE(CrvC_VersionSection::versionSection(data, fixedEnvironment()), versionTable(v));
+        const QString platform = sizeof(void *) == 8 ? QStringLiteral("LIN64") : QStringLiteral("LIN");
+        const QString expected = QString::fromLatin1(VersionTable)
+                                     .arg(QStringLiteral("Orb Design Suite:14.7"), config, family,
+                                          platform, device,
+                                          ids(QStringLiteral("fedcba9876543210fedcba9876543210"),
+                                              QStringLiteral("0123456789abcdef0123456789abcdef"),
+                                              QStringLiteral("1")),
+                                          QStringLiteral("csg324"), registration,
+                                          QStringLiteral("-2"))
+                                     .arg(QStringLiteral("Tue Mar 17 14:05:09 2009"));
+        QCOMPARE(CrvC_VersionSection::versionSection(data, fixedEnvironment()), expected);
         QCOMPARE(data.projectIteration, QStringLiteral("1"));
     }
 
