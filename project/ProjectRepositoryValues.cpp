@@ -130,16 +130,16 @@ QString ProjectRepositoryValues::projectAgeInDays(const QString &projectFile,
     return QString::number(created.daysTo(today));
 }
 
-QString ProjectRepositoryValues::projectIdentifier(const QString &projectFile) const
+QString ProjectRepositoryValues::projectIdentifier(const QString &projectFile,
+                                                  const QString &fresh) const
 {
-    QString identifier = QUuid::createUuid().toString(QUuid::Id128);
     if (!fileExists(projectFile))
-        return identifier;
+        return fresh;
     const QString stored = getValue(projectFile, QLatin1String(ProjectIdKey));
     if (!stored.isEmpty())
         return stored;
-    setValue(projectFile, QLatin1String(ProjectIdKey), identifier);
-    return identifier;
+    setValue(projectFile, QLatin1String(ProjectIdKey), fresh);
+    return fresh;
 }
 
 QString ProjectRepositoryValues::sendIteration(const QString &projectFile) const

@@ -24,10 +24,10 @@ public:
     QString projectAgeInDays(const QString &projectFile, const QDate &today) const;
 
     // The project identifier a report shows: the stored one; when the
-    // project file exists but has none yet, a new one that is stored; when
-    // the file does not exist, a new one that is not stored (so each such
-    // report carries a different identifier). 32 lower-case hex digits.
-    QString projectIdentifier(const QString &projectFile) const;
+    // project file exists but has none yet, `fresh` (a new identifier of 32
+    // lower-case hex digits), which is stored; when the file does not exist,
+    // `fresh` unstored (so each such report carries a different identifier).
+    QString projectIdentifier(const QString &projectFile, const QString &fresh) const;
     // The send iteration a report shows: the stored counter re-formatted in
     // base 10, or "1" when the file does not exist or holds no counter that
     // parses.

@@ -3,11 +3,12 @@
 #include "host/String.h"
 #include "project/ProjectRepositoryValues.h"
 
-QString CrvC_ProjectStatistics::projectStatisticsSection(const QString &projectFile)
+QString CrvC_ProjectStatistics::projectStatisticsSection(const QString &projectFile,
+                                                        const QDate &today)
 {
     ProjectDataManager::PairList rows;
     ProjectDataManager::collectProjectProperties(rows);
-    return sectionText(rows, ProjectRepositoryValues::instance().projectAgeInDays(projectFile));
+    return sectionText(rows, ProjectRepositoryValues::instance().projectAgeInDays(projectFile, today));
 }
 
 QString CrvC_ProjectStatistics::sectionText(const ProjectDataManager::PairList &rows,

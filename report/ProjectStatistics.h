@@ -2,6 +2,7 @@
 
 #include "project/ProjectDataManager.h"
 
+#include <QDate>
 #include <QString>
 
 // The "Project Statistics" table: the project facts of the host's project
@@ -9,8 +10,9 @@
 class CrvC_ProjectStatistics
 {
 public:
-    // The table for the host's current project and the age of `projectFile`.
-    static QString projectStatisticsSection(const QString &projectFile);
+    // The table for the host's current project and the age of `projectFile`
+    // on `today`.
+    static QString projectStatisticsSection(const QString &projectFile, const QDate &today);
 
     // The table for the given facts, followed by the age row ("Project
     // duration(days)") with `age` (empty when unknown): two cells to a row.

@@ -122,7 +122,7 @@ void CrvC_ReportBuilder::buildReport(const QString &projectFileArg, QString desi
         lines << CrvC_CommandLog::commandLineHistorySection(m_data);
     lines << CrvC_RunStatistics::runStatisticsSection(m_data.projectFile);
     lines << CrvC_HelpViewerData().sectionText();
-    lines << CrvC_ProjectStatistics::projectStatisticsSection(m_data.projectFile);
+    lines << CrvC_ProjectStatistics::projectStatisticsSection(m_data.projectFile, m_env.now().date());
     lines << CrvC_CoresStatistics().sectionText(
         projectFilePath(designName + QLatin1String("_lnkgen.drpt")));
     lines << CrvC_RunStatistics::parUsageSection(

@@ -6,24 +6,12 @@
 #include "plugin/CorvidSettings.h"
 #include "project/ProjectRepositoryValues.h"
 
-#include <QFile>
 
 namespace {
 
 QString versionValue(const char *key)
 {
     return Gui::Clip::String::convert(Port::Version::getValue(key));
-}
-
-bool projectFileExists(const CrvC_ReportData &data)
-{
-    return !data.projectFile.isEmpty() && QFile::exists(data.projectFile);
-}
-
-QString repositoryValue(const CrvC_ReportData &data, const char *key)
-{
-    return ProjectRepositoryValues::instance().getValue(data.projectFile,
-                                                        QString::fromLatin1(key));
 }
 
 } // namespace
@@ -52,28 +40,13 @@ QString CrvC_VersionSection::projectId(const CrvC_ReportData &data,
 {
     const QString fresh = environment.newIdentifier ? environment.newIdentifier()
                                                     : CrvC_Settings::newIdentifier();
-    if (!projectFileExists(data))
-        return fresh;
-    const QString stored = repositoryValue(data, ProjectRepositoryValues::ProjectIdKey);
-    if (!stored.isEmpty())
-        return stored;
-    ProjectRepositoryValues::instance().setValue(
-        data.projectFile, QString::fromLatin1(ProjectRepositoryValues::ProjectIdKey), fresh);
-    return fresh;
+    return ProjectRepositoryValues::instance().projectIdentifier(data.projectFile, fresh);
 }
 
 QString CrvC_VersionSection::projectIteration(CrvC_ReportData &data)
 {
-    if (!data.projectIteration.isEmpty())
-        return data.projectIteration;
-    data.projectIteration = QStringLiteral("1");
-    if (projectFileExists(data)) {
-        const QString stored = repositoryValue(data, ProjectRepositoryValues::SendIterationKey);
-        bool ok = false;
-        const int iteration = stored.toInt(&ok, 10);
-        if (ok)
-            data.projectIteration = QString::number(iteration);
-    }
+    if (data.projectIteration.isEmpty())
+        data.projectIteration = ProjectRepositoryValues::instance().sendIteration(data.projectFile);
     return data.projectIteration;
 }
 

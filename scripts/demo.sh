@@ -12,6 +12,8 @@ DEMO="$(cd "$BUILD_DIR" && pwd)/demo"
 rm -rf "$DEMO"
 mkdir -p "$DEMO/home"
 cp -R "$SRC/examples/ledctrl" "$DEMO/ledctrl"
+# The sample's repository (beside the project file) with its creation date.
+"$STAGE/bin/orb" new-project "$DEMO/ledctrl/ledctrl.orb"
 
 # A private home: the demo neither reads nor changes the user's own settings.
 export HOME="$DEMO/home"
@@ -19,8 +21,10 @@ export XDG_CONFIG_HOME="$HOME/.config" XDG_DATA_HOME="$HOME/.local/share"
 export QT_QPA_PLATFORM="${QT_QPA_PLATFORM:-offscreen}"
 
 # The help viewer's usage file lives in the user's data location.
-mkdir -p "$XDG_DATA_HOME/Vantor/orbhelpviewer"
-cp "$SRC/examples/helpviewer/orbhelpviewerdata.xml" "$XDG_DATA_HOME/Vantor/orbhelpviewer/" 2>/dev/null || true
+VERSION=$(sed -n 's/^version=//p' "$STAGE/data/orb_version" | head -n 1 | cut -c1-4)
+HELPDIR="$XDG_DATA_HOME/Vantor/Common/$VERSION"
+mkdir -p "$HELPDIR"
+cp "$SRC/examples/helpviewer/orbhelpviewerdata.xml" "$HELPDIR/"
 
 echo "== corvid-report: what would be sent"
 "$STAGE/bin/corvid-report" --project "$DEMO/ledctrl/ledctrl.orb" "$DEMO/ledctrl/ledctrl_usage.xml"

@@ -4,6 +4,7 @@
 #include "project/ProjectRepositoryValues.h"
 
 #include <QRegularExpression>
+#include <QUuid>
 #include <QtTest>
 
 // Corvid's values in the project repository: the project identifier, the
@@ -40,7 +41,7 @@ struct Report
 Report makeReport(const QString &projectFile)
 {
     const ProjectRepositoryValues &values = ProjectRepositoryValues::instance();
-    return {values.projectIdentifier(projectFile), values.sendIteration(projectFile)};
+    return {values.projectIdentifier(projectFile, QUuid::createUuid().toString(QUuid::Id128)), values.sendIteration(projectFile)};
 }
 
 } // namespace

@@ -90,7 +90,7 @@ void tst_ProjectStatistics::layout()
 // row, without an age.
 void tst_ProjectStatistics::noProject()
 {
-    QCOMPARE(CrvC_ProjectStatistics::projectStatisticsSection(m_env->home() + "/none/top.orb"),
+    QCOMPARE(CrvC_ProjectStatistics::projectStatisticsSection(m_env->home() + "/none/top.orb", QDate::currentDate()),
              head + ageCell("") + tail);
 }
 

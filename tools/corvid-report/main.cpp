@@ -2,6 +2,7 @@
 // cycle would, without showing or sending anything, so that a user or an
 // administrator can see what would be sent.
 
+#include "host/project/OrbProject.h"
 #include "plugin/CollectionCycle.h"
 #include "report/ReportBuilder.h"
 
@@ -90,9 +91,9 @@ int main(int argc, char **argv)
     if (!out.isEmpty())
         out = QFileInfo(out).absoluteFilePath();
 
-    if (!projectFileArg.isEmpty()) {
-        // Made current below, once the project model is linked in.
-    }
+    QString error;
+    if (!projectFileArg.isEmpty() && !OrbProject::openCurrentProject(projectFileArg, &error))
+        return fail(error);
 
     // As the collection cycle: the design name from the file name makes the
     // file's directory the working directory.

@@ -1,0 +1,267 @@
+// corvid-bench: generates a large design project (command log, usage XML,
+// netlist-build report, help viewer file, synthesis report, sub-report pages)
+// at several sizes and times the report build on each, so that the build's
+// growth with its input can be seen. Not a test: it prints figures.
+//
+//   corvid-bench [--scale F] [--steps N] [--keep DIR]
+//
+// Scale 1 is the reference project: 200,000 command-log lines, a usage XML of
+// about 50 MB, 20,000 core instances, 20,000 help entries. Step k of N builds
+// the project at k/N of the scale.
+
+#include "host/Version.h"
+#include "report/ReportBuilder.h"
+
+#include <QCoreApplication>
+#include <QDir>
+#include <QElapsedTimer>
+#include <QFile>
+#include <QFileInfo>
+#include <QTemporaryDir>
+
+#include <sys/resource.h>
+
+#include <cstdio>
+#include <functional>
+
+namespace {
+
+struct Sizes
+{
+    int commandLines;
+    int usageItems; // items in the usage XML, about 60 bytes each
+    int coreInstances;
+    int helpEntries;
+    int macroLines;
+};
+
+Sizes sizesFor(double scale)
+{
+    return {int(200000 * scale), int(800000 * scale), int(20000 * scale), int(20000 * scale),
+            int(50000 * scale)};
+}
+
+// Writes a file in chunks so that generating 50 MB needs little memory.
+bool writeChunks(const QString &path, const std::function<bool(QByteArray &chunk)> &next)
+{
+    QDir().mkpath(QFileInfo(path).absolutePath());
+    QFile file(path);
+    if (!file.open(QIODevice::WriteOnly))
+        return false;
+    QByteArray chunk;
+    chunk.reserve(1 << 20);
+    bool more = true;
+    while (more) {
+        chunk.clear();
+        more = next(chunk);
+        if (file.write(chunk) != chunk.size())
+            return false;
+    }
+    return true;
+}
+
+qint64 fileSize(const QString &path)
+{
+    return QFileInfo(path).size();
+}
+
+bool generate(const QString &dir, const QString &design, const Sizes &s, qint64 &bytes)
+{
+    const QString base = dir + QLatin1Char('/') + design;
+    bool ok = true;
+
+    int line = 0;
+    ok &= writeChunks(base + QLatin1String(".cmd_log"), [&](QByteArray &c) {
+        for (int i = 0; i < 5000 && line < s.commandLines; ++i, ++line) {
+            switch (line % 4) {
+            case 0: c += "synth -ifn \"" + design.toUtf8() + ".prj\" -ofn " + design.toUtf8() + ".ngc\n"; break;
+            case 1: c += "map -o " + design.toUtf8() + "_map.ncd " + design.toUtf8() + ".ngd -w\n"; break;
+            case 2: c += "par -w -ol high " + design.toUtf8() + "_map.ncd " + design.toUtf8() + ".ncd\n"; break;
+            default: c += "bitgen -w \"C:/work/" + design.toUtf8() + "/" + design.toUtf8() + ".ut\" x.bit\n"; break;
+            }
+        }
+        return line < s.commandLines;
+    });
+
+    // Four sections of equal size, groups of 50 items; one item in three has
+    // a value, the others "used"/"total" attrib children.
+    const char *sections[] = {"DesignStatistics", "DeviceUsage", "ReportConfigData", "ReportPinData"};
+    const int perSection = qMax(1, s.usageItems / 4);
+    int section = -1;
+    int item = 0;
+    ok &= writeChunks(base + QLatin1String("_usage.xml"), [&](QByteArray &c) {
+        if (section < 0) {
+            c += "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<DeviceUsageReport>\n";
+            section = 0;
+        }
+        for (int i = 0; i < 10000 && section < 4; ++i) {
+            if (item == 0)
+                c += QByteArray("<") + sections[section] + ">\n";
+            if (item % 50 == 0) {
+                const bool net = section == 0 && item % 1000 == 0;
+                c += "<group name=\"" + QByteArray(net ? "NetStatistics" : "Group") + QByteArray::number(item) + "\">\n";
+            }
+            if (item % 3 == 0)
+                c += "<item name=\"Slice LUTs\" value=\"" + QByteArray::number(item) + "\"/>\n";
+            else
+                c += "<item name=\"Registers\"><attrib name=\"used\" value=\"12\"/><attrib name=\"total\" value=\"100\"/></item>\n";
+            ++item;
+            if (item % 50 == 0 || item == perSection)
+                c += "</group>\n";
+            if (item == perSection) {
+                c += QByteArray("</") + sections[section] + ">\n";
+                item = 0;
+                ++section;
+            }
+        }
+        if (section == 4) {
+            c += "</DeviceUsageReport>\n";
+            return false;
+        }
+        return true;
+    });
+
+    int core = 0;
+    bool coreHeader = false;
+    ok &= writeChunks(base + QLatin1String("_lnkgen.drpt"), [&](QByteArray &c) {
+        if (!coreHeader) {
+            c += "<?xml version=\"1.0\"?>\n<document>\n";
+            coreHeader = true;
+        }
+        for (int i = 0; i < 2000 && core < s.coreInstances; ++i, ++core) {
+            c += "<scope stringID=\"LNKGEN_CORE_INSTANCE\" value=\"u" + QByteArray::number(core) + "\">\n"
+                 "<item stringID=\"LNKGEN_CORE_INFO\" type=\"fifo_generator\" value=\"x\" version=\"9.3\" vendor=\"vantor\"/>\n"
+                 "<item stringID=\"LNKGEN_CORE_PARAMETERS\" value=\"\" component_name=\"f\" depth=\"1024\" width=\"32\" clocks=\"2\"/>\n"
+                 "</scope>\n";
+        }
+        if (core >= s.coreInstances)
+            c += "</document>\n";
+        return core < s.coreInstances;
+    });
+
+    const QByteArray version = QByteArray(Port::Version::getValue("version").c_str()).left(4);
+    int help = 0;
+    bool helpHeader = false;
+    const QString helpFile = dir + QLatin1String("/appdata/Vantor/Common/") + QString::fromUtf8(version)
+                             + QLatin1String("/orbhelpviewerdata.xml");
+    ok &= writeChunks(helpFile, [&](QByteArray &c) {
+        if (!helpHeader) {
+            c += "<?xml version=\"1.0\"?>\n<HelpViewerData>\n";
+            helpHeader = true;
+        }
+        for (int i = 0; i < 2000 && help < s.helpEntries; ++i, ++help) {
+            if (help % 3 == 2)
+                c += "<OpenHelpFile count=\"" + QByteArray::number(help % 17) + "\">topic" + QByteArray::number(help) + ".htm</OpenHelpFile>\n";
+            else
+                c += "<SearchString found=\"" + QByteArray(help % 3 ? "false" : "true") + "\" count=\""
+                     + QByteArray::number(help % 9) + "\">search " + QByteArray::number(help) + "</SearchString>\n";
+        }
+        if (help >= s.helpEntries)
+            c += "</HelpViewerData>\n";
+        return help < s.helpEntries;
+    });
+
+    int macro = 0;
+    bool macroHeader = false;
+    ok &= writeChunks(base + QLatin1String(".snx"), [&](QByteArray &c) {
+        if (!macroHeader) {
+            c += "Synthesis log\n\n=========================================================================\n"
+                 "*                       Advanced HDL Synthesis Report                   *\n"
+                 "=========================================================================\n\n";
+            macroHeader = true;
+        }
+        for (int i = 0; i < 5000 && macro < s.macroLines; ++i, ++macro) {
+            if (macro % 20 == 0)
+                c += "# Registers                                          : " + QByteArray::number(macro) + "\n";
+            else
+                c += " Flip-Flops                                           : " + QByteArray::number(macro) + "\n";
+        }
+        if (macro >= s.macroLines)
+            c += "\n=========================================================================\n";
+        return macro < s.macroLines;
+    });
+
+    ok &= writeChunks(base + QLatin1String("_map.ktp"), [&](QByteArray &c) {
+        c += "Release 14.7 Map\n\nTarget Device  : xc6a25\nTarget Package : csg324\nTarget Speed   : -2\n";
+        return false;
+    });
+
+    int row = 0;
+    ok &= writeChunks(dir + QLatin1String("/par_usage_statistics.html"), [&](QByteArray &c) {
+        for (int i = 0; i < 2000 && row < s.coreInstances; ++i, ++row)
+            c += "<TR><TD>route pass " + QByteArray::number(row) + "</TD><TD>1</TD></TR>\n";
+        return row < s.coreInstances;
+    });
+
+    bytes = 0;
+    for (const QFileInfo &f : QDir(dir).entryInfoList(QDir::Files))
+        bytes += f.size();
+    bytes += fileSize(helpFile);
+    return ok;
+}
+
+long peakRssKiB()
+{
+    rusage usage{};
+    getrusage(RUSAGE_SELF, &usage);
+    return usage.ru_maxrss;
+}
+
+} // namespace
+
+int main(int argc, char **argv)
+{
+    QCoreApplication app(argc, argv);
+    double scale = 1.0;
+    int steps = 4;
+    QString keep;
+    const QStringList args = app.arguments();
+    for (int i = 1; i < args.size(); ++i) {
+        if (args.at(i) == QLatin1String("--scale") && i + 1 < args.size())
+            scale = args.at(++i).toDouble();
+        else if (args.at(i) == QLatin1String("--steps") && i + 1 < args.size())
+            steps = qMax(1, args.at(++i).toInt());
+        else if (args.at(i) == QLatin1String("--keep") && i + 1 < args.size())
+            keep = args.at(++i);
+        else {
+            std::fprintf(stderr, "usage: corvid-bench [--scale F] [--steps N] [--keep DIR]\n");
+            return 1;
+        }
+    }
+
+    QTemporaryDir temp;
+    const QString root = keep.isEmpty() ? temp.path() : QFileInfo(keep).absoluteFilePath();
+    std::printf("%-6s %12s %12s %10s %10s %12s %12s\n", "step", "cmd lines", "usage items",
+                "cores", "help", "input MB", "build ms");
+    for (int step = 1; step <= steps; ++step) {
+        const Sizes sizes = sizesFor(scale * step / steps);
+        const QString dir = root + QLatin1String("/step") + QString::number(step);
+        QDir().mkpath(dir);
+        qint64 bytes = 0;
+        if (!generate(dir, QStringLiteral("bench"), sizes, bytes)) {
+            std::fprintf(stderr, "corvid-bench: cannot write the project in %s\n", qPrintable(dir));
+            return 1;
+        }
+        qputenv("APPDATA", QFile::encodeName(dir + QLatin1String("/appdata")));
+        QDir::setCurrent(dir);
+
+        QElapsedTimer timer;
+        timer.start();
+        CrvC_ReportBuilder builder;
+        builder.createReport(QString(), QStringLiteral("bench"), QStringLiteral("Xc6"));
+        const qint64 ms = timer.elapsed();
+        if (!builder.written()) {
+            std::fprintf(stderr, "corvid-bench: the page was not written\n");
+            return 1;
+        }
+        std::printf("%-6d %12d %12d %10d %10d %12.1f %12lld\n", step, sizes.commandLines,
+                    sizes.usageItems, sizes.coreInstances, sizes.helpEntries, bytes / 1048576.0,
+                    static_cast<long long>(ms));
+        std::fflush(stdout);
+    }
+    std::printf("peak resident memory: %.1f MB; page of the last step: %.1f MB\n",
+                peakRssKiB() / 1024.0,
+                fileSize(root + QLatin1String("/step") + QString::number(steps)
+                         + QLatin1String("/device_usage_statistics.html")) / 1048576.0);
+    return 0;
+}
