@@ -166,7 +166,7 @@ bool generate(const QString &dir, const QString &design, const Sizes &s, qint64 
     ok &= writeChunks(base + QLatin1String(".snx"), [&](QByteArray &c) {
         if (!macroHeader) {
             c += "Synthesis log\n\n=========================================================================\n"
-                 "*                       Advanced HDL Synthesis Report                   *\n"
+                 "Advanced HDL Synthesis Report\n\nMacro Statistics\n"
                  "=========================================================================\n\n";
             macroHeader = true;
         }
