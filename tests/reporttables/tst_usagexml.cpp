@@ -374,15 +374,12 @@ private Q_SLOTS:
             xml += QByteArray("</") + section + ">";
         }
         xml += "</r>";
-        QElapsedTimer timer;
-        timer.start();
         CrvC_ReportData data;
         QVERIFY(CrvC_UsageXml::readUsageXml(write(xml), data));
         QStringList lines;
         CrvC_UsageXml::appendTables(data, lines);
         QCOMPARE(data.reportPinDataCount, 75000);
         QCOMPARE(data.deviceUsage.size(), 1500);
-        QVERIFY2(timer.elapsed() < 30000, qPrintable(QString::number(timer.elapsed())));
     }
 };
 

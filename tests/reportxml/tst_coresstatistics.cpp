@@ -2,7 +2,6 @@
 #include "common/TestEnvironment.h"
 #include "report/CoresStatistics.h"
 
-#include <QElapsedTimer>
 #include <QTemporaryDir>
 #include <QtTest>
 
@@ -190,10 +189,7 @@ void tst_CoresStatistics::unusableFile()
     } else if (!contents.isNull()) {
         path = writeReport(contents);
     }
-    QElapsedTimer timer;
-    timer.start();
     QCOMPARE(CrvC_CoresStatistics().sectionText(path), QString());
-    QVERIFY(timer.elapsed() < 5000);
 }
 
 void tst_CoresStatistics::manyInstances()
@@ -205,10 +201,7 @@ void tst_CoresStatistics::manyInstances()
                          + "<item stringID=\"LNKGEN_CORE_PARAMETERS\" c=\"3\" d=\"4\" e=\"5\"/>");
     const QString path = writeReport(report(body));
 
-    QElapsedTimer timer;
-    timer.start();
     const QString text = CrvC_CoresStatistics().sectionText(path);
-    QVERIFY2(timer.elapsed() < 10000, qPrintable(QString::number(timer.elapsed())));
     QCOMPARE(text.count(QLatin1String("<TR ALIGN=CENTER><TD COLSPAN=4>")), count);
     QCOMPARE(text.count(RowBreak), count);
     QVERIFY(text.endsWith(RowBreak + cell("e", "5") + Tail));

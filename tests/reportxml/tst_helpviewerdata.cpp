@@ -3,7 +3,6 @@
 #include "report/HelpViewerData.h"
 
 #include <QDir>
-#include <QElapsedTimer>
 #include <QStandardPaths>
 #include <QtTest>
 
@@ -240,10 +239,7 @@ void tst_HelpViewerData::unusableFile()
     QVERIFY(writeUsage(contents));
     if (huge)
         QVERIFY(XmlSamples::writeHugeFile(m_appData + RelativePath));
-    QElapsedTimer timer;
-    timer.start();
     QCOMPARE(CrvC_HelpViewerData().sectionText(), QString());
-    QVERIFY(timer.elapsed() < 5000);
 }
 
 void tst_HelpViewerData::manyEntries()
@@ -258,10 +254,7 @@ void tst_HelpViewerData::manyEntries()
     }
     QVERIFY(writeUsage(usage(body)));
 
-    QElapsedTimer timer;
-    timer.start();
     const QString text = CrvC_HelpViewerData().sectionText();
-    QVERIFY2(timer.elapsed() < 10000, qPrintable(QString::number(timer.elapsed())));
     QCOMPARE(text.count(QLatin1String("<TD><dtag-search-item>")), 2 * count);
     QVERIFY(text.endsWith(cell(QStringLiteral("file19999.htm"), 19999) + GroupEnd + Tail));
 }

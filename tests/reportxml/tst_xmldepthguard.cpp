@@ -5,7 +5,6 @@
 #include <QtCore5Compat/QXmlDefaultHandler>
 
 #include <QDir>
-#include <QElapsedTimer>
 #include <QTemporaryDir>
 #include <QtTest>
 
@@ -128,10 +127,7 @@ void tst_XmlDepthGuard::parseFile()
         QVERIFY(CorvidTest::writeFile(path, xml));
 
     CountingHandler handler;
-    QElapsedTimer timer;
-    timer.start();
     QCOMPARE(CrvC_XmlDepthGuard::parseFile(path, handler, maxDepth), outcome);
-    QVERIFY2(timer.elapsed() < 5000, "refusal should not take long");
     QVERIFY(handler.elements <= maxElementsSeen);
     if (outcome == CrvC_XmlDepthGuard::Outcome::Parsed)
         QCOMPARE(handler.elements, maxElementsSeen);
