@@ -151,29 +151,6 @@ private Q_SLOTS:
                  m_dir->filePath(QStringLiteral("device_usage_statistics.html")));
         QCOMPARE(CorvidTest::readFile(builder.data().reportPath), page.toUtf8());
     }
-
-    void exampleDesign()
-    {
-        const QString source =
-            CorvidTest::Environment::sourceDir() + QLatin1String("/examples/ledctrl/");
-        for (const char *name : {"ledctrl.snx", "ledctrl_map.ktp", "ledctrl_usage.xml"})
-            QVERIFY(QFile::copy(source + QLatin1String(name), QLatin1String(name)));
-
-        CrvC_ReportBuilder builder(environment());
-        builder.createReport(QStringLiteral("ledctrl.orb"), QStringLiteral("ledctrl"),
-                             QStringLiteral("Xc6"));
-        QCOMPARE(builder.data().targetDevice, QStringLiteral("xc6a25"));
-
-        QStringList lines;
-        CrvC_UsageXml::appendTables(builder.data(), lines);
-        const QString tables = lines.join(QLatin1Char('\n'));
-        const QString expected = QString::fromUtf8(CorvidTest::readFile(
-            QStringLiteral(CORVID_SOURCE_DIR "/tests/reporttables/ledctrl_tables.html")));
-        QCOMPARE(tables + QLatin1Char('\n'), expected);
-        QVERIFY(builder.pageText().contains(QLatin1String("\n") + tables + QLatin1String("\n")));
-        QVERIFY(builder.pageText().contains(QLatin1String(
-            "<dtag-property name=\"ProductConfiguration\"> (Professional)</dtag-property>")));
-    }
 };
 
 QTEST_GUILESS_MAIN(tst_ReportBuilder)
