@@ -1,7 +1,6 @@
 #include "common/TestEnvironment.h"
 #include "plugin/CorvidSettings.h"
 #include "report/ReportBuilder.h"
-#include "report/UsageXml.h"
 #include "report/VersionSection.h"
 
 #include <QDir>
