@@ -18,6 +18,8 @@ cp -R "$SRC/examples/ledctrl" "$DEMO/ledctrl"
 # A private home: the demo neither reads nor changes the user's own settings.
 export HOME="$DEMO/home"
 export XDG_CONFIG_HOME="$HOME/.config" XDG_DATA_HOME="$HOME/.local/share"
+export XDG_RUNTIME_DIR="$DEMO/run"
+mkdir -p -m 700 "$XDG_RUNTIME_DIR"
 export QT_QPA_PLATFORM="${QT_QPA_PLATFORM:-offscreen}"
 
 # The help viewer's usage file lives in the user's data location.
