@@ -5,6 +5,7 @@
 #include <QDir>
 #include <QFile>
 #include <QFileInfo>
+#include <QProcess>
 #include <QStandardPaths>
 
 namespace CorvidTest {
@@ -46,6 +47,25 @@ bool Environment::writeDataFile(const QString &relativePath, const QByteArray &c
 void Environment::clearSettings() const
 {
     QFile::remove(Gui::Clip::Settings::userFileName());
+}
+
+ToolRun runStaged(const QString &program, const QStringList &arguments, const QString &workDir,
+                  const QStringList &environment)
+{
+    QProcess tool;
+    tool.setWorkingDirectory(workDir);
+    QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
+    env.insert(QStringLiteral("QT_QPA_PLATFORM"), QStringLiteral("offscreen"));
+    for (const QString &entry : environment)
+        env.insert(entry.section(QLatin1Char('='), 0, 0), entry.section(QLatin1Char('='), 1));
+    tool.setProcessEnvironment(env);
+    tool.start(Environment::stageDir() + QLatin1String("/bin/") + program, arguments);
+    ToolRun run;
+    const bool finished = tool.waitForFinished(60000);
+    run.output = QString::fromUtf8(tool.readAllStandardOutput() + tool.readAllStandardError());
+    if (finished && tool.exitStatus() == QProcess::NormalExit)
+        run.exitCode = tool.exitCode();
+    return run;
 }
 
 bool writeFile(const QString &path, const QByteArray &contents)

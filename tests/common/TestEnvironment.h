@@ -1,6 +1,7 @@
 #pragma once
 
 #include <QString>
+#include <QStringList>
 #include <QTemporaryDir>
 
 #include <memory>
@@ -36,6 +37,18 @@ public:
 private:
     std::unique_ptr<QTemporaryDir> m_dir;
 };
+
+// What a program of the staged installation did.
+struct ToolRun
+{
+    int exitCode = -1; // -1 when it crashed or did not finish within a minute
+    QString output;    // standard output followed by standard error
+};
+
+// Runs <stage>/bin/<program> with `arguments` in `workDir` on the offscreen
+// platform, with the extra environment `environment` ("NAME=value" entries).
+ToolRun runStaged(const QString &program, const QStringList &arguments, const QString &workDir,
+                  const QStringList &environment = QStringList());
 
 // Writes `contents` to `path`, creating parent folders; false on failure.
 bool writeFile(const QString &path, const QByteArray &contents);

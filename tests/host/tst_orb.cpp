@@ -1,6 +1,5 @@
 #include "common/TestEnvironment.h"
 
-#include <QProcess>
 #include <QtTest>
 
 // orb as users run it: the real binary with the real plug-in directory.
@@ -48,20 +47,12 @@ void TestOrb::commandLine_data()
 void TestOrb::commandLine()
 {
     QFETCH(QStringList, arguments);
-    QProcess orb;
-    orb.setWorkingDirectory(m_work);
-    QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
-    env.insert(QStringLiteral("ORB_DEBUG"), QStringLiteral("1"));
-    env.insert(QStringLiteral("QT_QPA_PLATFORM"), QStringLiteral("offscreen"));
-    orb.setProcessEnvironment(env);
-    orb.start(CorvidTest::Environment::stageDir() + QLatin1String("/bin/orb"), arguments);
-    QVERIFY(orb.waitForFinished(60000));
-    const QString output = QString::fromUtf8(orb.readAllStandardOutput() + orb.readAllStandardError());
     QFETCH(QString, expectedOutput);
     QFETCH(int, exitCode);
-    QVERIFY2(output.contains(expectedOutput), qPrintable(output));
-    QCOMPARE(orb.exitStatus(), QProcess::NormalExit);
-    QCOMPARE(orb.exitCode(), exitCode);
+    const CorvidTest::ToolRun orb =
+        CorvidTest::runStaged(QStringLiteral("orb"), arguments, m_work, {QStringLiteral("ORB_DEBUG=1")});
+    QVERIFY2(orb.output.contains(expectedOutput), qPrintable(orb.output));
+    QCOMPARE(orb.exitCode, exitCode);
 }
 
 QTEST_GUILESS_MAIN(TestOrb)

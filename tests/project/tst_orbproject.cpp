@@ -8,7 +8,6 @@
 #include "host/project/RepositoryAccess.h"
 #include "project/ProjectRepositoryValues.h"
 
-#include <QProcess>
 #include <QtTest>
 
 using Gui::Clip::String;
@@ -183,17 +182,9 @@ void TestOrbProject::commandLine()
     if (filesAfter.contains(QLatin1String("kept.orb")))
         QVERIFY(CorvidTest::writeFile(dir + QLatin1String("/kept.orb"), Sample));
 
-    QProcess orb;
-    orb.setWorkingDirectory(dir);
-    QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
-    env.insert(QStringLiteral("QT_QPA_PLATFORM"), QStringLiteral("offscreen"));
-    orb.setProcessEnvironment(env);
-    orb.start(CorvidTest::Environment::stageDir() + QLatin1String("/bin/orb"), arguments);
-    QVERIFY(orb.waitForFinished(60000));
-    const QString output = QString::fromUtf8(orb.readAllStandardOutput() + orb.readAllStandardError());
-    QVERIFY2(output.contains(expectedOutput), qPrintable(output));
-    QCOMPARE(orb.exitStatus(), QProcess::NormalExit);
-    QCOMPARE(orb.exitCode(), exitCode);
+    const CorvidTest::ToolRun orb = CorvidTest::runStaged(QStringLiteral("orb"), arguments, dir);
+    QVERIFY2(orb.output.contains(expectedOutput), qPrintable(orb.output));
+    QCOMPARE(orb.exitCode, exitCode);
     QCOMPARE(QDir(dir).entryList(QDir::Files, QDir::Name), filesAfter);
 }
 

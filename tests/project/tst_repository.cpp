@@ -258,11 +258,10 @@ void TestRepository::valuesSurviveTheProcess()
     // A project created by orb carries its creation time: made today.
     const QString created = m_env->home() + QLatin1String("/created/led.orb");
     QDir().mkpath(QFileInfo(created).absolutePath());
-    QProcess orb;
-    orb.start(CorvidTest::Environment::stageDir() + QLatin1String("/bin/orb"),
-              {QStringLiteral("new-project"), created});
-    QVERIFY(orb.waitForFinished(60000));
-    QCOMPARE(orb.exitCode(), 0);
+    QCOMPARE(CorvidTest::runStaged(QStringLiteral("orb"), {QStringLiteral("new-project"), created},
+                                   m_env->home())
+                 .exitCode,
+             0);
     QCOMPARE(runTool({QStringLiteral("age"), created}), QByteArray("0"));
 }
 

@@ -1,6 +1,5 @@
 #include "common/TestEnvironment.h"
 
-#include <QProcess>
 #include <QtTest>
 
 #include <unistd.h>
@@ -66,13 +65,10 @@ void TestCorvidReport::commandLine()
     QFETCH(QString, expectedPage);
     if (getuid() == 0 && QTest::currentDataTag() == QLatin1String("unwritable place"))
         QSKIP("root writes everywhere");
-    QProcess tool;
-    tool.setWorkingDirectory(m_work);
-    tool.start(CorvidTest::Environment::stageDir() + QLatin1String("/bin/corvid-report"), arguments);
-    QVERIFY(tool.waitForFinished(60000));
-    const QString output = QString::fromUtf8(tool.readAllStandardOutput() + tool.readAllStandardError());
-    QVERIFY2(output.contains(expectedOutput), qPrintable(output));
-    QCOMPARE(tool.exitCode(), exitCode);
+    const CorvidTest::ToolRun tool =
+        CorvidTest::runStaged(QStringLiteral("corvid-report"), arguments, m_work);
+    QVERIFY2(tool.output.contains(expectedOutput), qPrintable(tool.output));
+    QCOMPARE(tool.exitCode, exitCode);
     if (!expectedPage.isEmpty())
         QVERIFY(CorvidTest::readFile(expectedPage).startsWith("<HTML><HEAD>"));
 }

@@ -30,6 +30,28 @@ QString newConnectionName()
     return QStringLiteral("Prjrep_Repository-%1").arg(++counter);
 }
 
+// Prepares `sql`, binds `values` in order and runs it.
+bool execute(QSqlQuery &query, const QString &sql, const QVariantList &values)
+{
+    if (!query.prepare(sql))
+        return false;
+    for (const QVariant &value : values)
+        query.addBindValue(value);
+    return query.exec();
+}
+
+// Runs a query for one value: StatusOk with *result, StatusNotFound when no
+// row matches, StatusFailed on an error.
+int selectOne(QSqlQuery &query, const QString &sql, const QVariantList &values, QVariant *result)
+{
+    if (!execute(query, sql, values))
+        return StatusFailed;
+    if (!query.next())
+        return StatusNotFound;
+    *result = query.value(0);
+    return StatusOk;
+}
+
 } // namespace
 
 QString RepositoryStore::fileNameFor(const QString &projectFile)
@@ -134,16 +156,13 @@ int RepositoryStore::createSchema()
 int RepositoryStore::findSection(qint64 parent, const QString &name, bool create, qint64 *id)
 {
     auto select = [&](QSqlQuery &query) {
-        if (!query.prepare(QStringLiteral("SELECT id FROM sections WHERE parent = ? AND name = ?")))
-            return int(StatusFailed);
-        query.addBindValue(parent);
-        query.addBindValue(name);
-        if (!query.exec())
-            return int(StatusFailed);
-        if (!query.next())
-            return int(StatusNotFound);
-        *id = query.value(0).toLongLong();
-        return int(StatusOk);
+        QVariant found;
+        const int status = selectOne(
+            query, QStringLiteral("SELECT id FROM sections WHERE parent = ? AND name = ?"),
+            {parent, name}, &found);
+        if (status == StatusOk)
+            *id = found.toLongLong();
+        return status;
     };
     const int status = run(false, select);
     if (status != StatusNotFound || !create)
@@ -151,11 +170,8 @@ int RepositoryStore::findSection(qint64 parent, const QString &name, bool create
     if (!m_writable)
         return StatusDenied;
     return run(true, [&](QSqlQuery &query) {
-        if (!query.prepare(QStringLiteral("INSERT OR IGNORE INTO sections(parent, name) VALUES(?, ?)")))
-            return int(StatusFailed);
-        query.addBindValue(parent);
-        query.addBindValue(name);
-        if (!query.exec())
+        if (!execute(query, QStringLiteral("INSERT OR IGNORE INTO sections(parent, name) VALUES(?, ?)"),
+                     {parent, name}))
             return int(StatusFailed);
         // Another process may have made it first; either way it is there now.
         return select(query);
@@ -165,16 +181,13 @@ int RepositoryStore::findSection(qint64 parent, const QString &name, bool create
 int RepositoryStore::value(qint64 section, const QString &key, QString *value)
 {
     return run(false, [&](QSqlQuery &query) {
-        if (!query.prepare(QStringLiteral("SELECT value FROM entries WHERE section = ? AND key = ?")))
-            return int(StatusFailed);
-        query.addBindValue(section);
-        query.addBindValue(key);
-        if (!query.exec())
-            return int(StatusFailed);
-        if (!query.next())
-            return int(StatusNotFound);
-        *value = query.value(0).toString();
-        return int(StatusOk);
+        QVariant found;
+        const int status = selectOne(
+            query, QStringLiteral("SELECT value FROM entries WHERE section = ? AND key = ?"),
+            {section, key}, &found);
+        if (status == StatusOk)
+            *value = found.toString();
+        return status;
     });
 }
 
@@ -183,13 +196,11 @@ int RepositoryStore::setValue(qint64 section, const QString &key, const QString 
     if (!m_writable)
         return StatusDenied;
     return run(true, [&](QSqlQuery &query) {
-        if (!query.prepare(QStringLiteral(
-                "INSERT OR REPLACE INTO entries(section, key, value) VALUES(?, ?, ?)")))
-            return int(StatusFailed);
-        query.addBindValue(section);
-        query.addBindValue(key);
-        query.addBindValue(value);
-        return query.exec() ? int(StatusOk) : int(StatusFailed);
+        return execute(query,
+                       QStringLiteral("INSERT OR REPLACE INTO entries(section, key, value) VALUES(?, ?, ?)"),
+                       {section, key, value})
+                   ? int(StatusOk)
+                   : int(StatusFailed);
     });
 }
 
