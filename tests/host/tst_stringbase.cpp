@@ -14,7 +14,6 @@ private Q_SLOTS:
     void tokens();
     void replace_data();
     void replace();
-    void format();
 };
 
 // The clean-up applied to a discovered proxy text: first ";" token, then the
@@ -94,15 +93,6 @@ void TestStringBase::replace()
     QCOMPARE(QString::fromStdString(s.str()), expected);
 }
 
-void TestStringBase::format()
-{
-    StringBase s;
-    s.Format("%d|%s", 42, "x");
-    QCOMPARE(s.str(), std::string("42|x"));
-    const std::string big(100000, 'z');
-    s.Format("<%s>", big.c_str());
-    QCOMPARE(s.Length(), big.size() + 2);
-}
 
 QTEST_GUILESS_MAIN(TestStringBase)
 #include "tst_stringbase.moc"

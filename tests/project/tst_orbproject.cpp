@@ -147,9 +147,6 @@ void TestOrbProject::commandLine_data()
     QTest::newRow("malformed project file")
         << QStringList{"--project", "broken.orb"} << 1
         << "orb: broken.orb: not a well-formed project file: line 1" << QStringList{"broken.orb"};
-    QTest::newRow("--project without a file") << QStringList{"--project"} << 1
-                                              << "--project needs a project file name"
-                                              << QStringList{"broken.orb"};
     QTest::newRow("new project")
         << QStringList{"new-project", "made.orb", "--family", "Xc6", "--speed", "-2"} << 0
         << "made.orb: project created" << QStringList{"broken.orb", "made.orb", "made.orbrepo"};
@@ -165,9 +162,6 @@ void TestOrbProject::commandLine_data()
     QTest::newRow("target options need new-project")
         << QStringList{"--family", "Xc6", "open", "x_usage.xml"} << 1
         << "only go with new-project" << QStringList{"broken.orb"};
-    QTest::newRow("new-project without a file")
-        << QStringList{"new-project"} << 1 << "new-project needs a project file name"
-        << QStringList{"broken.orb"};
 }
 
 void TestOrbProject::commandLine()

@@ -17,7 +17,6 @@ private Q_SLOTS:
     void refusesBadFiles();
     void deepNestingIsPassedOver_data();
     void deepNestingIsPassedOver();
-    void writeThenRead();
     void effectiveProperties_data();
     void effectiveProperties();
 
@@ -96,10 +95,8 @@ void TestProjectDocument::refusesBadFiles_data()
 
     QTest::newRow("missing file") << QByteArray("-") << "no such project file";
     QTest::newRow("empty file") << QByteArray() << "not a well-formed project file";
-    QTest::newRow("binary") << QByteArray("\x00\x01\xff\xfe garbage", 13) << "not a well-formed";
     QTest::newRow("unclosed element") << QByteArray("<project><sources>") << "line 1";
     QTest::newRow("other root") << QByteArray("<workspace/>") << "the root element is <workspace>";
-    QTest::newRow("text only") << QByteArray("just text") << "not a well-formed";
     QTest::newRow("file without path")
         << QByteArray("<project><sources><file type='VHDL'/></sources></project>")
         << "<file> needs a non-empty \"path\" attribute";
@@ -165,50 +162,6 @@ void TestProjectDocument::deepNestingIsPassedOver()
         QVERIFY2(error.contains(QLatin1String("not a well-formed")), qPrintable(error));
 }
 
-void TestProjectDocument::writeThenRead()
-{
-    ProjectDocument written;
-    written.name = QStringLiteral("ledctrl & co");
-    written.target = {QStringLiteral("Xc6"), QStringLiteral("xc6a25"), QStringLiteral("csg324"),
-                      QStringLiteral("-2")};
-    written.properties.append({QStringLiteral("PROP_Simulator"), QStringLiteral("<sim>"), true, false});
-    written.properties.append({QStringLiteral("PROP_UseTraceHint"), QString(), false, true});
-    written.sources.append({QStringLiteral("src/a b.vhd"), QStringLiteral("VHDL"), QString()});
-    written.sources.append({QStringLiteral("tb.v"), QStringLiteral("Verilog"), QStringLiteral("Sim")});
-    written.partitions = QStringList{QStringLiteral("/top"), QStringLiteral("/top/u1")};
-    ProjectDocument::ProcessProperty process;
-    process.id = QStringLiteral("id.1");
-    process.name = QStringLiteral("PROP_File");
-    process.value = QStringLiteral("x\"y'z");
-    process.hasValue = true;
-    process.fileProperty = true;
-    process.hidden = true;
-    process.conditions.append({QStringLiteral("DEVICE"), QStringLiteral("xc6a25")});
-    written.processProperties.append(process);
-
-    const QString file = path(QStringLiteral("written.orb"));
-    QString error;
-    QVERIFY2(written.write(file, &error), qPrintable(error));
-    ProjectDocument read;
-    QVERIFY2(read.read(file, &error), qPrintable(error));
-
-    QCOMPARE(read.name, written.name);
-    QCOMPARE(read.target.package, written.target.package);
-    QCOMPARE(read.properties.size(), 2);
-    QCOMPARE(read.properties.at(0).value, QStringLiteral("<sim>"));
-    QVERIFY(!read.properties.at(0).enabled);
-    QVERIFY(!read.properties.at(1).hasValue);
-    QCOMPARE(read.sources.at(1).association, QStringLiteral("Sim"));
-    QCOMPARE(read.partitions, written.partitions);
-    const ProjectDocument::ProcessProperty &back = read.processProperties.value(0);
-    QCOMPARE(back.id, process.id);
-    QCOMPARE(back.value, process.value);
-    QVERIFY(back.fileProperty && back.hidden && !back.excluded);
-    QCOMPARE(back.conditions.value(0).key, QStringLiteral("DEVICE"));
-
-    QVERIFY(!written.write(path(QStringLiteral("no/such/dir/x.orb")), &error));
-    QVERIFY2(error.contains(QLatin1String("cannot be written")), qPrintable(error));
-}
 
 void TestProjectDocument::effectiveProperties_data()
 {

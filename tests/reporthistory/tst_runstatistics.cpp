@@ -3,7 +3,6 @@
 #include "host/Factory.h"
 #include "host/QualityData.h"
 #include "host/RefObject.h"
-#include "report/ReportBuilder.h"
 #include "report/RunStatistics.h"
 
 #include <QDir>
@@ -81,14 +80,12 @@ private Q_SLOTS:
     void readerLibrary_data();
     void readerLibrary();
     void readerLibraryWithoutProject();
-    void sampleRecords();
     void frame_data();
     void frame();
     void readerMissing();
     void subReports_data();
     void subReports();
     void missingSubReports();
-    void builderPlacesTheSections();
 
 private:
     QString path(const QString &name) const { return m_dir.path() + QLatin1Char('/') + name; }
@@ -176,16 +173,6 @@ void tst_RunStatistics::readerLibraryWithoutProject()
     QCOMPARE(section, QString());
 }
 
-void tst_RunStatistics::sampleRecords()
-{
-    const QString section = CrvC_RunStatistics::runStatisticsSection(
-        CorvidTest::Environment::sourceDir() + QLatin1String("/examples/ledctrl/ledctrl.orb"));
-    QVERIFY(section.startsWith(frameOpening));
-    QVERIFY(section.endsWith(frameClosing));
-    QVERIFY(section.contains(toolRow("synth", {"3", "2", "1", "0", "124", "41.3", "2025-03-04"})));
-    QVERIFY(section.contains(toolRow("par", {"2", "1", "0", "1", "448", "224.0", "2025-03-04"})));
-}
-
 void tst_RunStatistics::frame_data()
 {
     QTest::addColumn<QByteArray>("answer");
@@ -269,31 +256,6 @@ void tst_RunStatistics::missingSubReports()
     QCOMPARE(CrvC_RunStatistics::osimUsageSection(path("none.html")), QStringLiteral("&nbsp;<BR>"));
     QVERIFY(QDir().mkpath(path("folder.html")));
     QCOMPARE(CrvC_RunStatistics::parUsageSection(path("folder.html")), QStringLiteral("&nbsp;<BR>"));
-}
-
-// Without a project the builder looks for its inputs in the working
-// directory: the simulator's page in its "osim" folder, the run records beside
-// the project file.
-void tst_RunStatistics::builderPlacesTheSections()
-{
-    const QString dir = path("builder");
-    QVERIFY(CorvidTest::writeFile(dir + "/par_usage_statistics.html", "p1\np2\n"));
-    QVERIFY(CorvidTest::writeFile(dir + "/osim_usage_statistics.html", "wrong folder\n"));
-    QVERIFY(CorvidTest::writeFile(dir + "/osim/osim_usage_statistics.html", "o1\no2\n"));
-    QVERIFY(CorvidTest::writeFile(dir + "/top.orb.runs", "par 2025-03-03T09:12:40 7 failed\n"));
-
-    const QString previous = QDir::currentPath();
-    QVERIFY(QDir::setCurrent(dir));
-    CrvC_ReportBuilder builder;
-    builder.createReport(dir + "/top", QStringLiteral("top"), QString());
-    QDir::setCurrent(previous);
-
-    const QString page = builder.pageText();
-    QVERIFY2(page.endsWith(QLatin1String("\n&nbsp;<BR>p1\np2\n\n&nbsp;<BR>o1o2\n</BODY></HTML>")),
-             qPrintable(page.right(200)));
-    QVERIFY(page.contains(QLatin1Char('\n')
-                          + framed(toolRow("par", {"1", "0", "1", "0", "7", "7.0", "2025-03-03"}))
-                          + QLatin1Char('\n')));
 }
 
 QTEST_GUILESS_MAIN(tst_RunStatistics)

@@ -355,32 +355,6 @@ private Q_SLOTS:
                                                  head("p") + list(items(1)) + Break + End));
     }
 
-    void largeDocumentIsLinear()
-    {
-        // Some 300 000 items in four sections: the reading must stay well
-        // within a second or two per megabyte.
-        QByteArray xml = "<r>";
-        const char *sections[] = {"DesignStatistics", "DeviceUsage", "ReportConfigData",
-                                  "ReportPinData"};
-        for (const char *section : sections) {
-            xml += QByteArray("<") + section + ">";
-            for (int g = 0; g < 1500; ++g) {
-                xml += "<group name='group" + QByteArray::number(g) + "'>";
-                for (int i = 0; i < 50; ++i)
-                    xml += "<item name='Registers'><attrib name='used' value='12'/>"
-                           "<attrib name='total' value='100'/></item>";
-                xml += "</group>";
-            }
-            xml += QByteArray("</") + section + ">";
-        }
-        xml += "</r>";
-        CrvC_ReportData data;
-        QVERIFY(CrvC_UsageXml::readUsageXml(write(xml), data));
-        QStringList lines;
-        CrvC_UsageXml::appendTables(data, lines);
-        QCOMPARE(data.reportPinDataCount, 75000);
-        QCOMPARE(data.deviceUsage.size(), 1500);
-    }
 };
 
 QTEST_GUILESS_MAIN(tst_UsageXml)

@@ -73,8 +73,6 @@ private Q_SLOTS:
     void sectionText();
     void unusableFile_data();
     void unusableFile();
-    void manyEntries();
-    void exampleFile();
 
 private:
     // Places `contents` where the help viewer keeps its file (under APPDATA).
@@ -220,55 +218,19 @@ void tst_HelpViewerData::sectionText()
 void tst_HelpViewerData::unusableFile_data()
 {
     QTest::addColumn<QByteArray>("contents");
-    QTest::addColumn<bool>("huge");
 
     const QByteArray entry = "<OrbHelpViewerData>" + helpFile("1", "f");
-    QTest::newRow("missing") << QByteArray() << false;
-    QTest::newRow("empty") << QByteArray("") << false;
-    QTest::newRow("binary") << XmlSamples::binaryBytes() << false;
-    QTest::newRow("huge") << QByteArray() << true;
-    QTest::newRow("50000 levels deep") << XmlSamples::deepDocument(50000, entry) << false;
+    QTest::newRow("missing") << QByteArray();
+    // The other unusable files are the depth guard's; this proves the reader goes through it.
     QTest::newRow("50000 levels deep behind an undeclared entity")
-        << XmlSamples::deepDocument(50000, entry + "&undeclared;") << false;
+        << XmlSamples::deepDocument(50000, entry + "&undeclared;");
 }
 
 void tst_HelpViewerData::unusableFile()
 {
     QFETCH(QByteArray, contents);
-    QFETCH(bool, huge);
     QVERIFY(writeUsage(contents));
-    if (huge)
-        QVERIFY(XmlSamples::writeHugeFile(m_appData + RelativePath));
     QCOMPARE(CrvC_HelpViewerData().sectionText(), QString());
-}
-
-void tst_HelpViewerData::manyEntries()
-{
-    const int count = 20000;
-    QByteArray body;
-    for (int i = 0; i < count; ++i) {
-        const QByteArray n = QByteArray::number(i);
-        const QByteArray count = "count=\"" + n + "\"";
-        body += search(i % 2 ? QByteArray("found=\"true\" " + count) : count, "word" + n)
-            + helpFile(n, "file" + n + ".htm");
-    }
-    QVERIFY(writeUsage(usage(body)));
-
-    const QString text = CrvC_HelpViewerData().sectionText();
-    QCOMPARE(text.count(QLatin1String("<TD><dtag-search-item>")), 2 * count);
-    QVERIFY(text.endsWith(cell(QStringLiteral("file19999.htm"), 19999) + GroupEnd + Tail));
-}
-
-void tst_HelpViewerData::exampleFile()
-{
-    const QByteArray example = CorvidTest::readFile(CorvidTest::Environment::sourceDir()
-                                                    + QLatin1String("/examples/helpviewer/orbhelpviewerdata.xml"));
-    QVERIFY(!example.isEmpty());
-    QVERIFY(writeUsage(example));
-    const QString text = CrvC_HelpViewerData().sectionText();
-    QVERIFY(text.contains(FoundHead));
-    QVERIFY(text.contains(NotFoundHead));
-    QVERIFY(text.contains(FilesHead));
 }
 
 QTEST_GUILESS_MAIN(tst_HelpViewerData)
