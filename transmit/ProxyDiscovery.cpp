@@ -1,0 +1,6 @@
+#include "ProxyDiscovery.h"
+
+QString CrvC_ProxyDiscovery::findProxy()
+{
+    return QString();
+}
