@@ -1,5 +1,5 @@
 #include "CollectionCycle.h"
-#include "CorvidSettings.h"
+#include "project/CorvidSettings.h"
 
 #include "host/AutoRelease.h"
 #include "host/FileEditorManager.h"

@@ -13,7 +13,7 @@
 #include "host/ProjectManager.h"
 #include "host/String.h"
 
-#include "plugin/CorvidSettings.h"
+#include "project/CorvidSettings.h"
 
 #include <QCoreApplication>
 #include <QSaveFile>

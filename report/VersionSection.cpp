@@ -3,7 +3,7 @@
 #include "host/Env.h"
 #include "host/String.h"
 #include "host/Version.h"
-#include "plugin/CorvidSettings.h"
+#include "project/CorvidSettings.h"
 #include "project/ProjectRepositoryValues.h"
 
 

@@ -1,6 +1,6 @@
 #include "common/TestEnvironment.h"
 
-#include "plugin/CorvidSettings.h"
+#include "project/CorvidSettings.h"
 
 #include <QDir>
 #include <QtTest>

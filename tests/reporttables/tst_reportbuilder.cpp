@@ -1,5 +1,5 @@
 #include "common/TestEnvironment.h"
-#include "plugin/CorvidSettings.h"
+#include "project/CorvidSettings.h"
 #include "report/ReportBuilder.h"
 #include "report/VersionSection.h"
 

@@ -1,6 +1,6 @@
 #include "common/TestEnvironment.h"
 #include "host/Settings.h"
-#include "plugin/CorvidSettings.h"
+#include "project/CorvidSettings.h"
 #include "report/VersionSection.h"
 
 #include <QRegularExpression>

@@ -8,7 +8,7 @@
 #include "host/project/OrbProject.h"
 #include "host/project/RepositoryAccess.h"
 #include "plugin/CollectionCycle.h"
-#include "plugin/CorvidSettings.h"
+#include "project/CorvidSettings.h"
 #include "project/ProjectRepositoryValues.h"
 #include "report/HelpViewerData.h"
 #include "report/ReportBuilder.h"
