@@ -24,8 +24,12 @@ public:
     }
     ~AutoRelease() { reset(); }
 
+    // Resetting to the pointer already held keeps it: releasing first would
+    // leave the wrapper holding an object that may already be gone.
     void reset(T *p = nullptr)
     {
+        if (p == m_p)
+            return;
         if (m_p)
             CitI::release(m_p);
         m_p = p;

@@ -21,6 +21,8 @@ struct Registry
     std::map<Port::XUID, Factory::Creator> creators;
     std::map<QString, CreateFunction> libraries; // by library name, in load order of names
     std::vector<CreateFunction> order;
+    // The loaded libraries, kept (never unloaded) for the life of the process.
+    std::vector<std::unique_ptr<QLibrary>> handles;
 };
 
 Registry &registry()
@@ -75,12 +77,11 @@ bool Factory::LoadLibraryFactory(const char *name)
             continue;
         // Component libraries stay loaded for the life of the process, like
         // the host's own; objects they created may outlive any caller.
-        auto *library = new QLibrary(path);
+        auto library = std::make_unique<QLibrary>(path);
         auto function = reinterpret_cast<CreateFunction>(library->resolve("CitP_CreateInstance"));
-        if (!function) {
-            delete library;
+        if (!function)
             continue;
-        }
+        r.handles.push_back(std::move(library));
         r.libraries.emplace(file, function);
         r.order.push_back(function);
         return true;

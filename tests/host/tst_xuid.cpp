@@ -29,6 +29,8 @@ private Q_SLOTS:
     void parse_data();
     void parse();
     void referenceCounting();
+    void handOver_data();
+    void handOver();
     void factoryAndInstanceTable();
 };
 
@@ -77,6 +79,57 @@ void TestXuid::referenceCounting()
         QCOMPARE(object->refCount(), 1);
     }
     QCOMPARE(deleted, 1);
+}
+
+// What a wrapper holding `first` does with its reference when handed another
+// pointer: `first` must live exactly as long as some wrapper still holds it.
+void TestXuid::handOver_data()
+{
+    QTest::addColumn<QString>("step");
+    QTest::addColumn<int>("firstDeletedAfterStep");
+    QTest::addColumn<int>("secondDeletedAfterStep");
+
+    QTest::newRow("reset to the pointer held") << "reset same" << 0 << 1;
+    QTest::newRow("reset to another") << "reset other" << 1 << 0;
+    QTest::newRow("reset to null") << "reset null" << 1 << 1;
+    QTest::newRow("out parameter") << "out" << 1 << 1;
+    QTest::newRow("move over another") << "move other" << 1 << 0;
+}
+
+void TestXuid::handOver()
+{
+    QFETCH(QString, step);
+    int firstDeleted = 0;
+    int secondDeleted = 0;
+    auto *first = new Counted(&firstDeleted);
+    auto *second = new Counted(&secondDeleted);
+    {
+        Prjrep::AutoRelease<CitI::IInterface> held(first);
+        if (step == QLatin1String("reset same")) {
+            held.reset(first);
+            delete second;
+        } else if (step == QLatin1String("reset other")) {
+            held.reset(second);
+        } else if (step == QLatin1String("reset null")) {
+            held.reset();
+            delete second;
+        } else if (step == QLatin1String("out")) {
+            QVERIFY(held.out() != nullptr);
+            QVERIFY(!held);
+            delete second;
+        } else {
+            Prjrep::AutoRelease<CitI::IInterface> other(second);
+            held = std::move(other);
+            QVERIFY(!other);
+        }
+        QTEST(firstDeleted, "firstDeletedAfterStep");
+        QTEST(secondDeleted, "secondDeletedAfterStep");
+        if (firstDeleted == 0)
+            QCOMPARE(held.get(), static_cast<CitI::IInterface *>(first));
+    }
+    // Whatever the wrapper still held is released exactly once.
+    QCOMPARE(firstDeleted, 1);
+    QCOMPARE(secondDeleted, 1);
 }
 
 void TestXuid::factoryAndInstanceTable()
