@@ -71,6 +71,13 @@ void TestProjectRepositoryValues::reportsAndSends_data()
     QTest::newRow("no project file") << false << QString() << "1" << QString() << "1" << false;
     QTest::newRow("counter abc") << true << "abc" << "1" << "abc" << "1" << true;
     QTest::newRow("leading zeros") << true << "007" << "7" << "8" << "8" << true;
+    // The counter is 64 bits wide and stops at its maximum instead of wrapping.
+    QTest::newRow("one below the cap") << true << "9223372036854775806" << "9223372036854775806"
+                                       << "9223372036854775807" << "9223372036854775807" << true;
+    QTest::newRow("at the cap") << true << "9223372036854775807" << "9223372036854775807"
+                                << "9223372036854775807" << "9223372036854775807" << true;
+    QTest::newRow("beyond 64 bits") << true << "9223372036854775808" << "1" << "9223372036854775808"
+                                    << "1" << true;
 }
 
 void TestProjectRepositoryValues::reportsAndSends()
