@@ -24,6 +24,7 @@ private Q_SLOTS:
     void loadAndApply_data();
     void loadAndApply();
     void changeBackAfterApply();
+    void applyBeforeShow();
 
 private:
     std::unique_ptr<CorvidTest::Environment> m_env;
@@ -173,6 +174,19 @@ void TestPreferencePage::changeBackAfterApply()
     page->sslRadioButton->setChecked(true);
     sheet.apply();
     QCOMPARE(stored(CrvC_Settings::UseSSL), QVariant(true));
+}
+
+void TestPreferencePage::applyBeforeShow()
+{
+    // Apply reaching a page that was never shown keeps the stored choices.
+    CorvidTest::store(CrvC_Settings::DontShowSendProgressDlg, true);
+    QWidget container;
+    CrvC_DataCollectionPropPageImpl page(&container, "DataCollectionPage");
+    PropSheetEvent apply(PropSheetEvent::ApplyChanges);
+    QCoreApplication::sendEvent(&page, &apply);
+    QCOMPARE(stored(CrvC_Settings::CollectDeviceUsage), QVariant(true));
+    QCOMPARE(stored(CrvC_Settings::DontShowSendProgressDlg), QVariant(true));
+    QVERIFY(!stored(CrvC_Settings::UseSSL).isValid());
 }
 
 QTEST_MAIN(TestPreferencePage)

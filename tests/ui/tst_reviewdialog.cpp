@@ -170,13 +170,19 @@ void TestReviewDialog::links()
 
 void TestReviewDialog::missingInstalledPages()
 {
+    // Folders in place of the pages, in the first installation root: no page
+    // to show, and the dialog still opens.
     const QString intro = m_env->installRoot() + QLatin1String("/data/reports/corvid_introduction.html");
     const QString help = m_env->installRoot() + QLatin1String("/data/reports/corvid_help.html");
-    QVERIFY(QFile::rename(intro, intro + QLatin1String(".off")));
-    QVERIFY(QFile::rename(help, help + QLatin1String(".off")));
+    for (const QString &page : {intro, help}) {
+        QVERIFY(QFile::rename(page, page + QLatin1String(".off")));
+        QVERIFY(QDir().mkdir(page));
+    }
     CrvC_DataCollectionDialog dialog;
-    QVERIFY(QFile::rename(intro + QLatin1String(".off"), intro));
-    QVERIFY(QFile::rename(help + QLatin1String(".off"), help));
+    for (const QString &page : {intro, help}) {
+        QVERIFY(QDir().rmdir(page));
+        QVERIFY(QFile::rename(page + QLatin1String(".off"), page));
+    }
 
     QVERIFY(dialog.introductionViewer()->toPlainText().startsWith(
         QLatin1String("The HTML page containing the Introduction for the Corvid feature is missing.")));
