@@ -201,11 +201,11 @@ void CrvC_SendUsingSSL::startUpload(const QString &address)
                 const int status = exitStatus == QProcess::NormalExit ? exitCode : -1;
                 Port_MsgManData::debugStub("Corvid: SSL upload ended with exit status %d: %s\n", status,
                                            answer.constData());
-                upload->deleteLater();
                 if (status != 0) {
                     Port_MsgManData::debugStub("Corvid ERROR: SSL upload failed: %s\n", errors.constData());
                     reportFailure(reportFile);
                 }
+                upload->deleteLater();
             });
     connect(upload, &QProcess::errorOccurred, upload, [upload, reportFile, keepAlive](QProcess::ProcessError error) {
         if (error != QProcess::FailedToStart)
