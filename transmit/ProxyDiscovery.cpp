@@ -66,6 +66,8 @@ QString CrvC_ProxyDiscovery::cleanUp(const QString &text)
 {
     Port::StringBase entry = Gui::Clip::String::convert(text);
     entry.Reduce(";", Port::StringBase::WholeDelimiter);
+    // Blanks before the keyword would otherwise be taken for the entry.
+    entry.Trim(" \t", Port::StringBase::TrimBoth);
     entry.Reduce("PROXY", Port::StringBase::WholeDelimiter);
     entry.Trim(" \t", Port::StringBase::TrimBoth);
     const QString result = Gui::Clip::String::convert(entry);
