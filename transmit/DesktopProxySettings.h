@@ -31,7 +31,8 @@ public:
     // One value printed by "gsettings get": 'text' unquoted, numbers as they are.
     static QString gsettingsValue(const QString &printed);
 
-    // KDE: the file kioslaverc in the user's configuration directory.
+    // KDE: the file kioslaverc in the user's configuration directory
+    // ($XDG_CONFIG_HOME, else ~/.config).
     static QString kioslavercPath();
     static CrvC_DesktopProxySettings fromKioslaverc(const QString &path);
     // KDE's proxy entries: "http://h:3128", "h:3128" or "h 3128" give "h:3128".
