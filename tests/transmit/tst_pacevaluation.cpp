@@ -1,6 +1,5 @@
 #include "common/TestEnvironment.h"
 
-#include "host/Settings.h"
 #include "transmit/ProxyDiscovery.h"
 #include "transmit/ProxyScript.h"
 
@@ -62,118 +61,83 @@ const QByteArray ProxyScriptText =
 class TestPacEvaluation : public QObject
 {
     Q_OBJECT
-
-private Q_SLOTS:
-    void initTestCase();
-    void cleanupTestCase();
-    void scriptFromLoopback_data();
-    void scriptFromLoopback();
-    void configuredScriptEndToEnd();
-    void badScripts_data();
-    void badScripts();
-
-private:
-    QString url(const char *path) const
-    {
-        return QStringLiteral("http://127.0.0.1:%1%2").arg(m_server.port.load()).arg(QLatin1String(path));
-    }
-    QStringList leftInTemp() const { return QDir(m_temp).entryList(QDir::Files | QDir::NoDotAndDotDot); }
-
     std::unique_ptr<CorvidTest::Environment> m_env;
     ScriptServer m_server;
     QString m_temp;
+
+    QString url(const QString &path) const { return QString("http://127.0.0.1:%1%2").arg(m_server.port).arg(path); }
+    QStringList leftInTemp() const { return QDir(m_temp).entryList(QDir::Files); }
+
+private Q_SLOTS:
+    void initTestCase()
+    {
+        m_env.reset(new CorvidTest::Environment);
+        for (const char *name : {"https_proxy", "HTTPS_PROXY", "http_proxy", "HTTP_PROXY", "all_proxy", "ALL_PROXY"})
+            qunsetenv(name);
+        qputenv("CORVID_SERVER", "https://www.vantor.example");
+        // The stand-in vancurl first on PATH; a private folder for temporary files.
+        const QString bin = m_env->home() + "/bin";
+        m_temp = m_env->home() + "/tmp";
+        QVERIFY(QDir().mkpath(bin) && QDir().mkpath(m_temp));
+        QVERIFY(QFile::copy(CORVID_FAKES_DIR "/fakevancurl", bin + "/vancurl"));
+        qputenv("PATH", QFile::encodeName(bin) + ':' + qgetenv("PATH"));
+        qputenv("TMPDIR", QFile::encodeName(m_temp));
+        QVERIFY(!CrvC_ProxyScript::evaluatorProgram().isEmpty());
+
+        m_server.files.insert("/wpad.dat", ProxyScriptText);
+        m_server.files.insert("/loop.pac", "function FindProxyForURL(url, host) { while (true) {} }");
+        m_server.files.insert("/throws.pac", "function FindProxyForURL(url, host) { throw 'no'; }");
+        m_server.files.insert("/syntax.pac", "function FindProxyForURL(url, host) { return \"PROXY");
+        m_server.files.insert("/binary.pac", QByteArray("\x7f" "ELF\0\0\xff\xfe", 8));
+        m_server.files.insert("/empty.pac", "");
+        m_server.start();
+        m_server.ready.acquire();
+        QVERIFY(m_server.port != 0);
+    }
+
+    void cleanupTestCase()
+    {
+        m_server.stopping = true;
+        m_server.wait();
+    }
+
+    void scripts_data()
+    {
+        QTest::addColumn<QString>("path");
+        QTest::addColumn<QString>("host");
+        QTest::addColumn<QString>("expected");
+        QTest::newRow("maker's server") << "/wpad.dat" << "www.vantor.example" << "PROXY h:8080; DIRECT";
+        QTest::newRow("other host") << "/wpad.dat" << "elsewhere.example" << "DIRECT";
+        QTest::newRow("loops") << "/loop.pac" << "www.vantor.example" << "";
+        QTest::newRow("throws") << "/throws.pac" << "www.vantor.example" << "";
+        QTest::newRow("syntax error") << "/syntax.pac" << "www.vantor.example" << "";
+        QTest::newRow("binary") << "/binary.pac" << "www.vantor.example" << "";
+        QTest::newRow("empty") << "/empty.pac" << "www.vantor.example" << "";
+        QTest::newRow("not found") << "/missing.pac" << "www.vantor.example" << "";
+    }
+
+    void scripts()
+    {
+        QFETCH(QString, path);
+        QFETCH(QString, host);
+        QFETCH(QString, expected);
+        QElapsedTimer timer;
+        timer.start();
+        QCOMPARE(CrvC_ProxyScript::run(url(path), "http://" + host, host), expected);
+        QVERIFY2(timer.elapsed() < CrvC_ProxyScript::TimeLimitMs + 3000, qPrintable(QString::number(timer.elapsed())));
+        QCOMPARE(leftInTemp(), QStringList());
+    }
+
+    void configuredScriptEndToEnd()
+    {
+        // The desktop names the script; nothing is stored in "WebUpdate".
+        QVERIFY(CorvidTest::writeFile(m_env->home() + "/.config/kioslaverc",
+                                      "[Proxy Settings]\nProxyType=2\nProxy Config Script=" + url("/wpad.dat").toUtf8()));
+        qputenv("XDG_CURRENT_DESKTOP", "KDE");
+        QCOMPARE(CrvC_ProxyDiscovery::findProxy(), "h:8080");
+        QCOMPARE(leftInTemp(), QStringList());
+    }
 };
-
-void TestPacEvaluation::initTestCase()
-{
-    m_env.reset(new CorvidTest::Environment);
-    for (const char *name : {"https_proxy", "HTTPS_PROXY", "http_proxy", "HTTP_PROXY", "all_proxy", "ALL_PROXY"})
-        qunsetenv(name);
-    qputenv("CORVID_SERVER", "https://www.vantor.example");
-
-    // vancurl is the stand-in, first on PATH.
-    const QString bin = m_env->home() + "/bin";
-    QVERIFY(QDir().mkpath(bin));
-    QVERIFY(QFile::copy(QStringLiteral(CORVID_FAKES_DIR "/fakevancurl"), bin + "/vancurl"));
-    qputenv("PATH", QFile::encodeName(bin) + ':' + qgetenv("PATH"));
-    // A private temporary folder, to see that downloaded scripts go away.
-    m_temp = m_env->home() + "/tmp";
-    QVERIFY(QDir().mkpath(m_temp));
-    qputenv("TMPDIR", QFile::encodeName(m_temp));
-    QVERIFY(QDir::tempPath() == QDir(m_temp).canonicalPath() || QDir::tempPath() == m_temp);
-
-    QVERIFY(!CrvC_ProxyScript::evaluatorProgram().isEmpty());
-
-    m_server.files.insert("/wpad.dat", ProxyScriptText);
-    m_server.files.insert("/loop.pac", "function FindProxyForURL(url, host) { while (true) {} }");
-    m_server.files.insert("/throws.pac", "function FindProxyForURL(url, host) { throw 'no'; }");
-    m_server.files.insert("/syntax.pac", "function FindProxyForURL(url, host) { return \"PROXY");
-    m_server.files.insert("/binary.pac", QByteArray("\x7f" "ELF\0\0\xff\xfe", 8));
-    m_server.files.insert("/empty.pac", "");
-    m_server.start();
-    m_server.ready.acquire();
-    QVERIFY(m_server.port != 0);
-}
-
-void TestPacEvaluation::cleanupTestCase()
-{
-    m_server.stopping = true;
-    m_server.wait();
-}
-
-void TestPacEvaluation::scriptFromLoopback_data()
-{
-    QTest::addColumn<QString>("testUrl");
-    QTest::addColumn<QString>("host");
-    QTest::addColumn<QString>("expected");
-    QTest::newRow("maker's server") << "http://www.vantor.example" << "www.vantor.example" << "PROXY h:8080; DIRECT";
-    QTest::newRow("other host") << "http://elsewhere.example" << "elsewhere.example" << "DIRECT";
-}
-
-void TestPacEvaluation::scriptFromLoopback()
-{
-    QFETCH(QString, testUrl);
-    QFETCH(QString, host);
-    QFETCH(QString, expected);
-    QCOMPARE(CrvC_ProxyScript::run(url("/wpad.dat"), testUrl, host), expected);
-    QCOMPARE(leftInTemp(), QStringList());
-}
-
-void TestPacEvaluation::configuredScriptEndToEnd()
-{
-    // The desktop names a script; nothing is stored in "WebUpdate".
-    QVERIFY(CorvidTest::writeFile(m_env->home() + "/.config/kioslaverc",
-                                  "[Proxy Settings]\nProxyType=2\nProxy Config Script=" + url("/wpad.dat").toUtf8()
-                                      + "\n"));
-    qputenv("XDG_CURRENT_DESKTOP", "KDE");
-    const QString proxy = CrvC_ProxyDiscovery::findProxy();
-    qunsetenv("XDG_CURRENT_DESKTOP");
-    QFile::remove(m_env->home() + "/.config/kioslaverc");
-    QCOMPARE(proxy, QStringLiteral("h:8080"));
-    QCOMPARE(leftInTemp(), QStringList());
-}
-
-void TestPacEvaluation::badScripts_data()
-{
-    QTest::addColumn<QString>("path");
-    QTest::newRow("loops") << "/loop.pac";
-    QTest::newRow("throws") << "/throws.pac";
-    QTest::newRow("syntax error") << "/syntax.pac";
-    QTest::newRow("binary") << "/binary.pac";
-    QTest::newRow("empty") << "/empty.pac";
-    QTest::newRow("not found") << "/missing.pac";
-}
-
-void TestPacEvaluation::badScripts()
-{
-    QFETCH(QString, path);
-    QElapsedTimer timer;
-    timer.start();
-    QCOMPARE(CrvC_ProxyScript::run(url(qPrintable(path)), "http://www.vantor.example", "www.vantor.example"),
-             QString());
-    QVERIFY2(timer.elapsed() < CrvC_ProxyScript::TimeLimitMs + 3000, qPrintable(QString::number(timer.elapsed())));
-    QCOMPARE(leftInTemp(), QStringList());
-}
 
 QTEST_GUILESS_MAIN(TestPacEvaluation)
 #include "tst_pacevaluation.moc"
