@@ -34,6 +34,8 @@ void CrvC_DataCollectionEmail::send(const QString &tool, const QString &to, cons
             process->deleteLater();
     });
     connect(process, &QProcess::finished, process, &QObject::deleteLater);
+    // Nobody reads the program's output: it goes where the host's goes.
+    process->setProcessChannelMode(QProcess::ForwardedChannels);
     process->setStandardInputFile(QProcess::nullDevice());
     process->start(words.first(), words.mid(1), QIODevice::ReadWrite);
 }
