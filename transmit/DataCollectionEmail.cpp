@@ -38,6 +38,9 @@ void CrvC_DataCollectionEmail::send(const QString &tool, const QString &to, cons
     process->setProcessChannelMode(QProcess::ForwardedChannels);
     process->setStandardInputFile(QProcess::nullDevice());
     process->start(words.first(), words.mid(1), QIODevice::ReadWrite);
+    // Settles the start here, so that a failure is reported while this object
+    // still exists (callers drop it as soon as send() returns).
+    process->waitForStarted(5000);
 }
 
 QStringList CrvC_DataCollectionEmail::commandWords(const QString &command, const QString &argument)

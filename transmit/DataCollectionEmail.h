@@ -12,8 +12,8 @@ class CrvC_DataCollectionEmailImpl;
 // Sends the report through the user's own mail program: composes a message
 // to the collection mailbox with the report attached and starts the program.
 // This build uses the Unix implementation (CrvC_DataCollectionUnixImpl).
-// Keep the object until send() has returned: a program that cannot be started
-// is reported through onProcessError.
+// A program that cannot be started is reported through onProcessError before
+// send() returns, so the object may be dropped right after.
 class CrvC_DataCollectionEmail : public QObject
 {
     Q_OBJECT
@@ -26,7 +26,7 @@ public:
     // The mail programs to offer, the preferred one first.
     QStringList emailTools();
 
-    // Starts `tool` composing a message; returns at once.
+    // Starts `tool` composing a message; returns once it has started or failed.
     void send(const QString &tool, const QString &to, const QString &subject,
               const QString &body, const QString &file);
 
