@@ -5,6 +5,7 @@
 
 #include <QDir>
 #include <QFile>
+#include <QFileInfo>
 #include <QProcess>
 #include <QStandardPaths>
 #include <QTextStream>
@@ -12,6 +13,7 @@
 namespace {
 
 const char *const GnomeSchema = "org.gnome.system.proxy";
+const qint64 MaxKioslavercBytes = 1024 * 1024;
 
 // Runs gsettings with `arguments`; false when it cannot run, fails or hangs.
 bool runGsettings(const QString &program, const QStringList &arguments, QString *output)
@@ -125,6 +127,10 @@ QString CrvC_DesktopProxySettings::kioslavercPath()
 CrvC_DesktopProxySettings CrvC_DesktopProxySettings::fromKioslaverc(const QString &path)
 {
     CrvC_DesktopProxySettings settings;
+    // Only a regular file of a sensible size: a pipe in its place would block.
+    const QFileInfo info(path);
+    if (!info.isFile() || info.size() > MaxKioslavercBytes)
+        return settings;
     QFile file(path);
     if (!file.open(QIODevice::ReadOnly | QIODevice::Text))
         return settings;

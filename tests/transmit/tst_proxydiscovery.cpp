@@ -9,6 +9,8 @@
 
 #include <QtTest>
 
+#include <sys/stat.h>
+
 namespace {
 
 // Answers fixed texts and records which steps were asked.
@@ -189,6 +191,7 @@ private Q_SLOTS:
                                     << "4|http://c/p.pac|";
         QTest::newRow("KDE detect") << "KDE" << QStringList{head + "ProxyType=3"} << "8||";
         QTest::newRow("KDE other group") << "KDE" << QStringList{"[Other]\nProxyType=3\n" + head} << "0||";
+        QTest::newRow("KDE named pipe") << "KDE" << QStringList{"FIFO"} << "0||";
         QTest::newRow("KDE binary") << "KDE" << QStringList{QString::fromLatin1("\xff[Proxy\x01=\x02")} << "0||";
         QTest::newRow("GNOME auto") << "GNOME" << QStringList{"'auto'", "''", "", ""} << "8||";
         QTest::newRow("GNOME script") << "GNOME" << QStringList{"'auto'", "'http://c/p.pac'", "", ""}
@@ -207,7 +210,10 @@ private Q_SLOTS:
         QFETCH(QString, expected);
         CrvC_DesktopProxySettings settings;
         if (desktop == "KDE") {
-            QVERIFY(CorvidTest::writeFile(m_env->home() + "/.config/kioslaverc", input.at(0).toUtf8()));
+            const QString path = m_env->home() + "/.config/kioslaverc";
+            QFile::remove(path);
+            QVERIFY(input.at(0) == "FIFO" ? mkfifo(QFile::encodeName(path), 0600) == 0
+                                          : CorvidTest::writeFile(path, input.at(0).toUtf8()));
             qputenv("XDG_CURRENT_DESKTOP", "KDE");
             settings = CrvC_DesktopProxySettings::current();
             qunsetenv("XDG_CURRENT_DESKTOP");
