@@ -5,6 +5,7 @@
 #                   checks in build-asan/ and run every test there
 #   make fuzz       build the fuzz harnesses in build-fuzz/ and fuzz each one
 #                   for FUZZ_SECONDS (make fuzz FUZZ_SECONDS=600 for a long run)
+#   make screenshots  render the dialogs to docs/screenshots
 
 BUILD_DIR ?= build
 JOBS ?= $(shell nproc)
@@ -21,7 +22,7 @@ SANITIZER_ENV = ASAN_OPTIONS=detect_leaks=1 \
 	LSAN_OPTIONS=suppressions=$(CURDIR)/tests/lsan.supp:print_suppressions=0 \
 	UBSAN_OPTIONS=print_stacktrace=1:halt_on_error=1
 
-.PHONY: all deps configure build test sanitize fuzz demo clean
+.PHONY: all deps configure build test sanitize fuzz demo screenshots clean
 
 all: build
 
@@ -49,6 +50,9 @@ fuzz: deps
 
 demo: build
 	sh scripts/demo.sh $(BUILD_DIR)
+
+screenshots: build
+	$(BUILD_DIR)/stage/bin/corvid-screenshots --out docs/screenshots
 
 clean:
 	rm -rf $(BUILD_DIR) $(ASAN_DIR) $(FUZZ_DIR)
