@@ -1,13 +1,41 @@
 #include "CorvidPlugin.h"
 #include "CollectionCycle.h"
 
+#include "transmit/UserNotice.h"
+
 #include "host/FileSupervisor.h"
 #include "host/InstanceTable.h"
 #include "host/String.h"
+#include "host/gui/Dialog.h"
 
 #include <QCoreApplication>
+#include <QMessageBox>
 
 using Gui::Clip::String;
+
+namespace {
+
+// What the parts without widgets need of the user: the host's warning box,
+// the send method dialog, and the windows of the collection cycle.
+void installHandlers()
+{
+    CrvC_UserNotice::setHandlers(
+        [](const QString &text) {
+            Gui::Clip::MessageBox::warning(nullptr, QCoreApplication::translate("CrvC_CorvidPlugin", "Corvid"),
+                                           text, QMessageBox::Ok);
+        },
+        {});
+}
+
+// The library may be unloaded after the plug-in object: nothing may keep
+// pointing into it.
+void removeHandlers()
+{
+    CrvC_UserNotice::setHandlers({}, {});
+    CrvC_CollectionCycle::setDialogs({});
+}
+
+} // namespace
 
 CrvC_CorvidPlugin::CrvC_CorvidPlugin()
 {
@@ -18,10 +46,12 @@ CrvC_CorvidPlugin::CrvC_CorvidPlugin()
             this, SLOT(onDataRequested(Gui::Clip::DataCollector&)));
     CitP::InstanceTable::RegisterInstance(GuiI::IFileEditorManager::iid(),
                                           static_cast<GuiI::IFileEditorManager *>(this));
+    installHandlers();
 }
 
 CrvC_CorvidPlugin::~CrvC_CorvidPlugin()
 {
+    removeHandlers();
     CitP::InstanceTable::UnRegisterInstance(static_cast<GuiI::IFileEditorManager *>(this));
     Gui::Clip::FileSupervisor::getInstance()->unregisterEditor(
         static_cast<GuiI::IFileEditorManager *>(this));
