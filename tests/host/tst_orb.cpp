@@ -45,6 +45,8 @@ void TestOrb::commandLine_data()
         << QStringList{"open", "top_usage.xml", "--design", "blinker"} << 0 << "(design \"blinker\")";
     QTest::newRow("collection off: nothing built")
         << QStringList{"open", "top_usage.xml"} << 0 << "Corvid: collection is switched off";
+    QTest::newRow("folder that is gone")
+        << QStringList{"open", m_work + "/gone/top_usage.xml"} << 0 << "Corvid: cannot enter the folder";
     QTest::newRow("open without file") << QStringList{"open"} << 1 << "open needs a file name";
     QTest::newRow("unknown option") << QStringList{"--bogus"} << 1 << "unknown argument: --bogus";
 }

@@ -32,6 +32,7 @@ private Q_SLOTS:
     void gating_data();
     void gating();
     void unreachableFolderEndsTheCycle();
+    void reportToolRefusesUnreachableFolder();
 
 private:
     std::unique_ptr<CorvidTest::Environment> m_env;
@@ -149,6 +150,17 @@ void TestCollectionCycle::unreachableFolderEndsTheCycle()
         QCOMPARE(m_starts.size(), 0);
         QCOMPARE(QDir::currentPath(), before);
     }
+}
+
+void TestCollectionCycle::reportToolRefusesUnreachableFolder()
+{
+    const QString work = m_env->home() + QLatin1String("/cwd");
+    QVERIFY(CorvidTest::writeFile(work + QLatin1String("/top_usage.xml"), "<usage/>"));
+    const CorvidTest::ToolRun tool = CorvidTest::runStaged(
+        QStringLiteral("corvid-report"), {m_env->home() + QLatin1String("/gone/top_usage.xml")}, work);
+    QCOMPARE(tool.exitCode, 1);
+    QVERIFY2(tool.output.contains(QLatin1String("cannot enter the folder")), qPrintable(tool.output));
+    QVERIFY(!QFile::exists(work + QLatin1String("/device_usage_statistics.html")));
 }
 
 QTEST_GUILESS_MAIN(TestCollectionCycle)
