@@ -1,7 +1,11 @@
 #include "CorvidPlugin.h"
 #include "CollectionCycle.h"
+#include "ui/DataCollectionDialog.h"
 #include "ui/PropPageCreator.h"
+#include "ui/SendClipDlg.h"
+#include "ui/SendToClipDlg.h"
 
+#include "host/MsgManData.h"
 #include "transmit/UserNotice.h"
 
 #include "host/FileSupervisor.h"
@@ -25,7 +29,34 @@ void installHandlers()
             Gui::Clip::MessageBox::warning(nullptr, QCoreApplication::translate("CrvC_CorvidPlugin", "Corvid"),
                                            text, QMessageBox::Ok);
         },
-        {});
+        [](const QString &reportFile) {
+            CrvC_SendToClipDlg::showSendMethodDialogForEmail(nullptr, reportFile);
+        });
+
+    CrvC_CollectionCycle::Dialogs dialogs;
+    dialogs.sendAtOnce = [](const QString &projectFile, const QString &designName,
+                            const QString &targetFamily) {
+        CrvC_DataCollectionDialog review(nullptr);
+        review.createReport(projectFile, designName, targetFamily);
+        // Without a new page (no design name given, the page could not be
+        // written) an older page may still lie there; it is not this report.
+        if (!review.builder().written()) {
+            Port_MsgManData::debugStub("Corvid: no report written, nothing sent\n");
+            return;
+        }
+        review.sendData();
+    };
+    dialogs.countDown = [](const QString &projectFile, const QString &designName,
+                           const QString &targetFamily) {
+        auto *countdown = new CrvC_SendClipDlg(nullptr, projectFile, designName, targetFamily);
+        if (!countdown->reviewDialog()->builder().written()) {
+            Port_MsgManData::debugStub("Corvid: no report written, nothing sent\n");
+            delete countdown;
+            return;
+        }
+        countdown->show();
+    };
+    CrvC_CollectionCycle::setDialogs(dialogs);
 }
 
 // The library may be unloaded after the plug-in object: nothing may keep
