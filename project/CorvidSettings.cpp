@@ -1,5 +1,6 @@
 #include "CorvidSettings.h"
 
+#include "host/InputFile.h"
 #include "host/Settings.h"
 #include "host/VantorPath.h"
 
@@ -41,8 +42,9 @@ void CrvC_Settings::readInstallSettings(QString &timestamp, bool &collect)
     }
     if (path.isEmpty())
         return;
-    QFile file(path);
-    if (!file.open(QIODevice::ReadOnly | QIODevice::Text))
+    QFile file;
+    if (Port::InputFile::open(path, Port::InputFile::InstallSettings, file)
+        != Port::InputFile::Status::Opened)
         return;
     QTextStream in(&file);
     in.setEncoding(QStringConverter::Utf8);

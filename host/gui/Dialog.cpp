@@ -108,15 +108,6 @@ int MessageBox::warning(QWidget *parent, const QString &caption, const QString &
 
 namespace {
 
-bool openOnDesktop(const QUrl &url)
-{
-    if (QGuiApplication::platformName() == QLatin1String("offscreen")) {
-        std::fprintf(stderr, "orb: no display to open %s\n", qUtf8Printable(url.toString()));
-        return false;
-    }
-    return QDesktopServices::openUrl(url);
-}
-
 HelpManager::Launcher &launcher()
 {
     static HelpManager::Launcher current;
@@ -127,7 +118,7 @@ bool launch(const QUrl &url)
 {
     if (!url.isValid() || url.isEmpty())
         return false;
-    return launcher() ? launcher()(url) : openOnDesktop(url);
+    return launcher() ? launcher()(url) : QDesktopServices::openUrl(url);
 }
 
 } // namespace

@@ -70,14 +70,14 @@ class ORBHOSTGUI_EXPORT HelpManager
 {
 public:
     // Opens `url` (an address, or a local file path) in the user's browser;
-    // false when that failed or `url` is empty. Without a display (offscreen)
-    // nothing is started and the answer is false.
+    // false when that failed or `url` is empty.
     static bool runWebBrowser(const QString &url);
     // Opens the help file at `topic` the same way; false without a help file.
     static bool showHelpTopic(const QString &helpFile, const QString &topic);
 
     // What starts the browser; the default hands the address to the desktop
-    // (QDesktopServices). Tests install their own so that no browser is ever
+    // (QDesktopServices, whose URL handlers apply; the offscreen platform
+    // opens nothing). Tests install their own so that no browser is ever
     // launched; an empty function restores the default.
     using Launcher = std::function<bool(const QUrl &url)>;
     static void setLauncher(Launcher launcher);

@@ -188,7 +188,7 @@ void TestVantorUpdatePage::browser()
         if (!opened.isEmpty())
             QCOMPARE(launched.first().toString(), opened);
     }
-    // Without a display the default launches nothing.
+    // The offscreen platform launches nothing.
     HelpManager::setLauncher({});
     QVERIFY(!HelpManager::runWebBrowser(address));
 }
