@@ -53,6 +53,12 @@ QByteArray forDebug(const QByteArray &text)
     return line;
 }
 
+// A redirect page is a few hundred bytes; a lookup that answers more than
+// this is stopped rather than buffered in the host's memory.
+const qint64 MaxLookupAnswer = 1024 * 1024;
+// Of the upload's answer only the start is kept, for the debug output.
+const int MaxUploadAnswer = 4096;
+
 std::shared_ptr<QEventLoopLocker> keepApplicationAlive()
 {
     if (!QCoreApplication::instance())
@@ -101,6 +107,11 @@ QStringList CrvC_SendUsingSSL::uploadArguments(const QString &url) const
 
 void CrvC_SendUsingSSL::SendFile(const QString &file)
 {
+    if (m_lookupProcess) {
+        Port_MsgManData::debugStub("Corvid ERROR: a send is already under way for %s\n",
+                                   qUtf8Printable(m_reportFile));
+        return;
+    }
     m_reportFile = file;
     m_keepAlive = keepApplicationAlive();
     const QStringList arguments = redirectArguments();
@@ -114,6 +125,13 @@ void CrvC_SendUsingSSL::SendFile(const QString &file)
         // once control is back in the event loop, as for a failed lookup.
         if (error == QProcess::FailedToStart)
             QTimer::singleShot(0, this, &CrvC_SendUsingSSL::lookupFailedToStart);
+    });
+    connect(m_lookupProcess, &QProcess::readyReadStandardOutput, this, [this] {
+        if (m_lookupProcess->bytesAvailable() > MaxLookupAnswer && m_lookupProcess->state() == QProcess::Running) {
+            Port_MsgManData::debugStub("Corvid ERROR: the address lookup answered more than %lld bytes.\n",
+                                       static_cast<long long>(MaxLookupAnswer));
+            m_lookupProcess->kill(); // finished follows, as a failed lookup
+        }
     });
     m_lookupProcess->start(QLatin1String(ProgramName), arguments, QIODevice::ReadWrite);
 }
@@ -167,18 +185,27 @@ void CrvC_SendUsingSSL::startUpload(const QString &address)
     auto *upload = new QProcess;
     const QString reportFile = m_reportFile;
     std::shared_ptr<QEventLoopLocker> keepAlive = m_keepAlive;
+    auto answerStart = std::make_shared<QByteArray>();
+    auto keepAnswerStart = [upload, answerStart] {
+        const QByteArray chunk = upload->readAllStandardOutput();
+        if (answerStart->size() < MaxUploadAnswer)
+            answerStart->append(chunk.left(MaxUploadAnswer - answerStart->size()));
+    };
+    connect(upload, &QProcess::readyReadStandardOutput, upload, keepAnswerStart);
     connect(upload, &QProcess::finished, upload,
-            [upload, reportFile, keepAlive](int exitCode, QProcess::ExitStatus exitStatus) {
-                const QByteArray answer = forDebug(upload->readAllStandardOutput());
+            [upload, reportFile, keepAlive, answerStart, keepAnswerStart](int exitCode,
+                                                                          QProcess::ExitStatus exitStatus) {
+                keepAnswerStart();
+                const QByteArray answer = forDebug(*answerStart);
                 const QByteArray errors = forDebug(upload->readAllStandardError());
                 const int status = exitStatus == QProcess::NormalExit ? exitCode : -1;
                 Port_MsgManData::debugStub("Corvid: SSL upload ended with exit status %d: %s\n", status,
                                            answer.constData());
-                upload->deleteLater();
                 if (status != 0) {
                     Port_MsgManData::debugStub("Corvid ERROR: SSL upload failed: %s\n", errors.constData());
                     reportFailure(reportFile);
                 }
+                upload->deleteLater();
             });
     connect(upload, &QProcess::errorOccurred, upload, [upload, reportFile, keepAlive](QProcess::ProcessError error) {
         if (error != QProcess::FailedToStart)

@@ -75,12 +75,10 @@ private Q_SLOTS:
         for (const char *name : {"https_proxy", "HTTPS_PROXY", "http_proxy", "HTTP_PROXY", "all_proxy", "ALL_PROXY"})
             qunsetenv(name);
         qputenv("CORVID_SERVER", "https://www.vantor.example");
-        // The stand-in vancurl first on PATH; a private folder for temporary files.
-        const QString bin = m_env->home() + "/bin";
+        // The staged vancurl first on PATH; a private folder for temporary files.
         m_temp = m_env->home() + "/tmp";
-        QVERIFY(QDir().mkpath(bin) && QDir().mkpath(m_temp));
-        QVERIFY(QFile::copy(CORVID_FAKES_DIR "/fakevancurl", bin + "/vancurl"));
-        qputenv("PATH", QFile::encodeName(bin) + ':' + qgetenv("PATH"));
+        QVERIFY(QDir().mkpath(m_temp));
+        qputenv("PATH", QFile::encodeName(CorvidTest::Environment::stageDir()) + "/bin:" + qgetenv("PATH"));
         qputenv("TMPDIR", QFile::encodeName(m_temp));
         QVERIFY(!CrvC_ProxyScript::evaluatorProgram().isEmpty());
 

@@ -34,6 +34,7 @@ private Q_SLOTS:
     void registrationId();
     void sends_data();
     void sends();
+    void oversizedLookupAnswer();
 
 private:
     std::unique_ptr<Environment> m_env;
@@ -267,6 +268,23 @@ void TestSendUsingSSL::sends()
         QCOMPARE(m_server->uploadFolders().size(), 0);
     }
     m_server.reset();
+}
+
+void TestSendUsingSSL::oversizedLookupAnswer()
+{
+    // A lookup that pours out data is stopped, not buffered in the host.
+    const QString fake = m_env->home() + QLatin1String("/fakebin/vancurl");
+    QVERIFY(writeFile(fake, "#!/bin/sh\nhead -c 3000000 /dev/zero | tr '\\0' x\n"
+                            "printf '\\nURL=https://h.example/u\"\\n'\n"));
+    QVERIFY(QFile::setPermissions(fake, QFile::ReadOwner | QFile::WriteOwner | QFile::ExeOwner));
+    const QByteArray path = qgetenv("PATH");
+    qputenv("PATH", QFile::encodeName(m_env->home() + QLatin1String("/fakebin:")) + path);
+    QPointer<CrvC_SendUsingSSL> sender = new CrvC_SendUsingSSL(QString());
+    sender->SendFile(QStringLiteral("/r.html"));
+    qputenv("PATH", path);
+    QTRY_VERIFY_WITH_TIMEOUT(sender.isNull(), 30000);
+    QCOMPARE(m_offers, QStringList{"/r.html"});
+    QVERIFY(!m_debug.join(QString()).contains(QLatin1String("has started")));
 }
 
 QTEST_GUILESS_MAIN(TestSendUsingSSL)

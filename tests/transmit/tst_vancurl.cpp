@@ -124,8 +124,6 @@ void TestVancurl::transfers_data()
     QTest::newRow("unknown topic") << QStringList{"--cacert", "{CA}", "{URL}/cgi-bin/SW_Docs_Redirect/sw_docs_redirect?topic=x"}
                                    << QStringList() << 6 << "" << 0;
     QTest::newRow("wrong CA") << QStringList{"--cacert", "{OTHERCA}", lookup} << QStringList() << 5 << "" << 0;
-    QTest::newRow("wrong CA, upload") << QStringList{"--cacert", "{OTHERCA}"} + upload + QStringList{"-F", "access=v9orn", "{URL}/upload"}
-                                      << QStringList() << 5 << "" << 0;
     QTest::newRow("system CAs only") << QStringList{lookup} << QStringList() << 5 << "" << 0;
     QTest::newRow("CA file missing") << QStringList{"--cacert", "{CA}.missing", lookup} << QStringList() << 5 << "" << 0;
     QTest::newRow("upload file missing")
