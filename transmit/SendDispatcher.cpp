@@ -4,12 +4,9 @@
 #include "SendUsingSSL.h"
 #include "project/CorvidSettings.h"
 
-#include <QTimer>
 #include <QVariant>
 
 namespace {
-
-const int EmailKeepAliveMs = 60000;
 
 CrvC_SendDispatcher::Starter &starter()
 {
@@ -28,13 +25,11 @@ void startMethod(CrvC_SendDispatcher::Method method, const QString &tool, const 
         (new CrvC_SendUsingSSL())->SendFile(file);
         return;
     }
-    // The mail program runs on by itself, but the sender must outlive its
-    // start, which succeeds or fails later in the event loop, so that a
-    // failure can still be shown.
-    auto *email = new CrvC_DataCollectionEmail();
-    email->send(tool, CrvC_SendDispatcher::emailRecipient(), CrvC_SendDispatcher::emailSubject(),
-                QString(), file);
-    QTimer::singleShot(EmailKeepAliveMs, email, &QObject::deleteLater);
+    // send() returns once the program has started or its failure has been
+    // shown; the program runs on by itself.
+    CrvC_DataCollectionEmail email;
+    email.send(tool, CrvC_SendDispatcher::emailRecipient(), CrvC_SendDispatcher::emailSubject(),
+               QString(), file);
 }
 
 } // namespace

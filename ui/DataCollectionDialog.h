@@ -43,6 +43,9 @@ public:
     // device_usage_statistics.html, fixed when the dialog was made.
     QString reportPath() const;
     CrvC_ReportBuilder &builder() { return m_builder; }
+    // Shows the page of the last build in the Contents tab (createReport
+    // does this itself).
+    void showContents();
     // True when the Contents tab shows only the beginning of the page.
     bool contentsCut() const { return m_contentsCut; }
 
@@ -74,7 +77,6 @@ public Q_SLOTS:
 
 private:
     void onContentsAnchorClicked(const QUrl &url);
-    void showContents();
     CrvC_ReportBuilder::Environment builderEnvironment();
 
     CrvC_ReportBuilder m_builder;

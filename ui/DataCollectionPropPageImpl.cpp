@@ -36,6 +36,7 @@ void CrvC_DataCollectionPropPageImpl::customEvent(QEvent *event)
 void CrvC_DataCollectionPropPageImpl::loadPage()
 {
     m_loaded = CrvC_PreferenceValues::load();
+    m_pageLoaded = true;
     collectionCheckBox->setChecked(m_loaded.collect);
     showSendProgressCheckBox->setChecked(m_loaded.dontShowProgress);
     sslRadioButton->setChecked(m_loaded.useSsl);
@@ -59,6 +60,10 @@ void CrvC_DataCollectionPropPageImpl::loadPage()
 
 void CrvC_DataCollectionPropPageImpl::applyPage()
 {
+    // The form's boxes start cleared: applying a page that was never loaded
+    // would switch collection off behind the user's back.
+    if (!m_pageLoaded)
+        loadPage();
     CrvC_PreferenceValues::Values shown;
     shown.collect = collectionCheckBox->isChecked();
     shown.dontShowProgress = showSendProgressCheckBox->isChecked();

@@ -32,6 +32,7 @@ protected:
 
 private:
     CrvC_PreferenceValues::Values m_loaded;
+    bool m_pageLoaded = false;
     QStringList m_mailPrograms;
     bool m_mailProgramsRead = false;
 };

@@ -8,34 +8,31 @@
 
 namespace CorvidTest {
 
-// Records what the send step starts instead of starting it.
-class SendRecorder
+// Records what the send step starts ("upload", "email <tool>") instead of
+// starting it.
+struct SendRecorder
 {
-public:
     SendRecorder()
     {
-        CrvC_SendDispatcher::setStarter(
-            [this](CrvC_SendDispatcher::Method method, const QString &tool, const QString &file) {
-                sends << (method == CrvC_SendDispatcher::Method::Upload ? QStringLiteral("upload")
-                                                                        : QLatin1String("email ") + tool);
-                files << file;
-            });
+        CrvC_SendDispatcher::setStarter([this](CrvC_SendDispatcher::Method method, const QString &tool,
+                                               const QString &file) {
+            sends << (method == CrvC_SendDispatcher::Method::Upload ? QStringLiteral("upload")
+                                                                    : QLatin1String("email ") + tool);
+            files << file;
+        });
     }
     ~SendRecorder() { CrvC_SendDispatcher::setStarter(nullptr); }
-    SendRecorder(const SendRecorder &) = delete;
-    SendRecorder &operator=(const SendRecorder &) = delete;
-
-    QStringList sends; // "upload" or "email <tool>"
+    QStringList sends;
     QStringList files;
 };
 
-// A stored setting, or an invalid QVariant when the key was never written.
+// A stored setting; invalid when the key was never written.
 inline QVariant stored(const char *key)
 {
     return CrvC_Settings::value(key, QVariant());
 }
 
-// Stores `value` under `key`; an invalid QVariant stores nothing.
+// Stores `value`; an invalid one stores nothing.
 inline void store(const char *key, const QVariant &value)
 {
     if (value.isValid())

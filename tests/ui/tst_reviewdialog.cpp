@@ -24,14 +24,10 @@ private Q_SLOTS:
     void cleanupTestCase();
     void exits_data();
     void exits();
-    void tabButtons_data();
-    void tabButtons();
     void links();
     void missingInstalledPages();
     void designNamePrompt_data();
     void designNamePrompt();
-    void largePage_data();
-    void largePage();
     void largeReportInDialog();
 
 public Q_SLOTS:
@@ -89,11 +85,18 @@ void TestReviewDialog::exits_data()
     QTest::addColumn<QString>("action");
     QTest::addColumn<int>("result");
     QTest::addColumn<QString>("counter"); // the project's send counter afterwards
+    QTest::addColumn<int>("tab");         // the tab shown at the end
 
-    QTest::newRow("send") << "send" << int(QDialog::Accepted) << "2";
-    QTest::newRow("decline") << "decline" << int(QDialog::Rejected) << QString();
-    QTest::newRow("escape") << "escape" << int(QDialog::Rejected) << QString();
-    QTest::newRow("close") << "close" << int(QDialog::Rejected) << QString();
+    const int intro = CrvC_DataCollectionDialog::IntroductionTab;
+    QTest::newRow("send") << "send" << int(QDialog::Accepted) << "2" << intro;
+    QTest::newRow("decline") << "decline" << int(QDialog::Rejected) << QString() << intro;
+    QTest::newRow("escape") << "escape" << int(QDialog::Rejected) << QString() << intro;
+    QTest::newRow("close") << "close" << int(QDialog::Rejected) << QString() << intro;
+    // These two only change the tab; the dialog is then declined.
+    QTest::newRow("Verify Contents") << "verify" << int(QDialog::Rejected) << QString()
+                                     << int(CrvC_DataCollectionDialog::ContentsTab);
+    QTest::newRow("Help") << "help" << int(QDialog::Rejected) << QString()
+                          << int(CrvC_DataCollectionDialog::HelpTab);
 }
 
 void TestReviewDialog::exits()
@@ -105,8 +108,13 @@ void TestReviewDialog::exits()
     dialog.createReport(project, QStringLiteral("top"), QStringLiteral("Kestrel"));
 
     QStringList sentWhileOpen;
+    int tab = -1;
     CorvidTest::onNextModal<CrvC_DataCollectionDialog>([&](CrvC_DataCollectionDialog *open) {
-        if (action == QLatin1String("send")) {
+        if (action == QLatin1String("verify") || action == QLatin1String("help")) {
+            (action == QLatin1String("verify") ? open->verifyButton() : open->helpButton())->click();
+            tab = open->isVisible() ? open->tabWidget()->currentIndex() : -2;
+            open->declineButton()->click();
+        } else if (action == QLatin1String("send")) {
             open->sendButton()->click();
             sentWhileOpen = recorder.sends;
         } else if (action == QLatin1String("decline")) {
@@ -117,7 +125,9 @@ void TestReviewDialog::exits()
             open->close();
         }
     });
+    QVERIFY(!dialog.contentsCut());
     QTEST(dialog.exec(), "result");
+    QTEST(tab < 0 ? dialog.tabWidget()->currentIndex() : tab, "tab");
 
     const bool sends = action == QLatin1String("send");
     QCOMPARE(sentWhileOpen, sends ? QStringList{QStringLiteral("upload")} : QStringList());
@@ -127,28 +137,6 @@ void TestReviewDialog::exits()
     QTEST(ProjectRepositoryValues::instance().getValue(
               project, QLatin1String(ProjectRepositoryValues::SendIterationKey)),
           "counter");
-}
-
-void TestReviewDialog::tabButtons_data()
-{
-    QTest::addColumn<QString>("button");
-    QTest::addColumn<int>("tab");
-
-    QTest::newRow("Verify Contents") << "verify" << int(CrvC_DataCollectionDialog::ContentsTab);
-    QTest::newRow("Help") << "help" << int(CrvC_DataCollectionDialog::HelpTab);
-}
-
-void TestReviewDialog::tabButtons()
-{
-    QFETCH(QString, button);
-    CorvidTest::SendRecorder recorder;
-    CrvC_DataCollectionDialog dialog;
-    dialog.show();
-    QCOMPARE(dialog.tabWidget()->currentIndex(), int(CrvC_DataCollectionDialog::IntroductionTab));
-    (button == QLatin1String("verify") ? dialog.verifyButton() : dialog.helpButton())->click();
-    QTEST(dialog.tabWidget()->currentIndex(), "tab");
-    QVERIFY(dialog.isVisible());
-    QVERIFY(recorder.sends.isEmpty());
 }
 
 void TestReviewDialog::links()
@@ -170,13 +158,19 @@ void TestReviewDialog::links()
 
 void TestReviewDialog::missingInstalledPages()
 {
+    // Folders in place of the pages, in the first installation root: no page
+    // to show, and the dialog still opens.
     const QString intro = m_env->installRoot() + QLatin1String("/data/reports/corvid_introduction.html");
     const QString help = m_env->installRoot() + QLatin1String("/data/reports/corvid_help.html");
-    QVERIFY(QFile::rename(intro, intro + QLatin1String(".off")));
-    QVERIFY(QFile::rename(help, help + QLatin1String(".off")));
+    for (const QString &page : {intro, help}) {
+        QVERIFY(QFile::rename(page, page + QLatin1String(".off")));
+        QVERIFY(QDir().mkdir(page));
+    }
     CrvC_DataCollectionDialog dialog;
-    QVERIFY(QFile::rename(intro + QLatin1String(".off"), intro));
-    QVERIFY(QFile::rename(help + QLatin1String(".off"), help));
+    for (const QString &page : {intro, help}) {
+        QVERIFY(QDir().rmdir(page));
+        QVERIFY(QFile::rename(page + QLatin1String(".off"), page));
+    }
 
     QVERIFY(dialog.introductionViewer()->toPlainText().startsWith(
         QLatin1String("The HTML page containing the Introduction for the Corvid feature is missing.")));
@@ -221,49 +215,6 @@ void TestReviewDialog::designNamePrompt()
     QCOMPARE(dialog.builder().data().targetDevice.isEmpty(), design.isEmpty());
 }
 
-void TestReviewDialog::largePage_data()
-{
-    QTest::addColumn<int>("lines");
-    QTest::addColumn<bool>("cut");
-
-    // About 100 characters a line.
-    const int perLimit = CrvC_DataCollectionDialog::ContentsLimit / 100;
-    QTest::newRow("small") << 50 << false;
-    QTest::newRow("just below the limit") << perLimit - 2 << false;
-    QTest::newRow("above the limit") << perLimit + 5 << true;
-    QTest::newRow("tens of times the limit") << perLimit * 30 << true;
-}
-
-void TestReviewDialog::largePage()
-{
-    QFETCH(int, lines);
-    QString page = QStringLiteral("<HTML><HEAD><TITLE>t</TITLE></HEAD>\n<BODY TEXT='#000000'>\n");
-    for (int i = 0; i < lines; ++i)
-        page += QStringLiteral("<TR><TD>name</TD><TD><dtag-item1>v=%1</dtag-item1></TD></TR>")
-                    .arg(i, 6, 10, QLatin1Char('0'))
-                    .leftJustified(99, QLatin1Char(' '))
-                + QLatin1Char('\n');
-    page += QLatin1String("</BODY></HTML>");
-
-    bool cut = false;
-    const QString text = CrvC_DataCollectionDialog::contentsText(page, &cut);
-    QTEST(cut, "cut");
-    if (!cut) {
-        QCOMPARE(text, page);
-        return;
-    }
-    QVERIFY(text.size() < CrvC_DataCollectionDialog::ContentsLimit + 1000);
-    // The notice with the link comes right after the body tag; the page
-    // follows in whole lines.
-    const qsizetype notice = text.indexOf(QLatin1String("<P><B>"));
-    const qsizetype noticeEnd = text.indexOf(QLatin1String("<HR>"), notice) + 4;
-    QCOMPARE(text.left(notice), page.left(notice));
-    QVERIFY(text.mid(notice, noticeEnd - notice).contains(QLatin1String(CrvC_DataCollectionDialog::BrowseContentsUrl)));
-    const QString shown = text.left(notice) + text.mid(noticeEnd);
-    QVERIFY(page.startsWith(shown));
-    QCOMPARE(page.at(shown.size()), QLatin1Char('\n'));
-}
-
 void TestReviewDialog::largeReportInDialog()
 {
     // A usage page of the design tools well above the viewer's limit lands
@@ -278,9 +229,21 @@ void TestReviewDialog::largeReportInDialog()
     CrvC_DataCollectionDialog dialog;
     dialog.createReport(newProject(QStringLiteral("large")), QStringLiteral("large"), QString());
     QFile::remove(QStringLiteral("par_usage_statistics.html"));
-    QVERIFY(dialog.builder().pageText().size() > CrvC_DataCollectionDialog::ContentsLimit);
+    const QString page = dialog.builder().pageText();
+    QVERIFY(page.size() > CrvC_DataCollectionDialog::ContentsLimit);
     QVERIFY(dialog.contentsCut());
     QVERIFY(dialog.contentsViewer()->toPlainText().size() < CrvC_DataCollectionDialog::ContentsLimit);
+
+    // The notice with the link comes right after the body tag; the page
+    // follows in whole lines.
+    const QString text = CrvC_DataCollectionDialog::contentsText(page);
+    const qsizetype notice = text.indexOf(QLatin1String("<P><B>"));
+    const qsizetype noticeEnd = text.indexOf(QLatin1String("<HR>"), notice) + 4;
+    QVERIFY(text.left(notice).endsWith(QLatin1Char('>')) && text.left(notice).contains(QLatin1String("<BODY")));
+    QVERIFY(text.mid(notice, noticeEnd - notice).contains(QLatin1String(CrvC_DataCollectionDialog::BrowseContentsUrl)));
+    const QString shown = text.left(notice) + text.mid(noticeEnd);
+    QVERIFY(page.startsWith(shown));
+    QCOMPARE(page.at(shown.size()), QLatin1Char('\n'));
 
     Q_EMIT dialog.contentsViewer()->anchorClicked(QUrl(QLatin1String(CrvC_DataCollectionDialog::BrowseContentsUrl)));
     QCOMPARE(m_opened, QStringList{QUrl::fromLocalFile(QFileInfo(dialog.reportPath()).absoluteFilePath()).toString()});
