@@ -113,7 +113,13 @@ void VantorUpdatePage::applyPage()
     settings.setValue(QString::fromLatin1(ChoiceKey), choice);
     if (choice != ManualProxy)
         return;
-    settings.setValue(QString::fromLatin1(HostKey), m_host->text().trimmed());
+    // Without a host the transfers fall back to the system's settings; an
+    // empty stored host would read as a proxy named "".
+    const QString host = m_host->text().trimmed();
+    if (host.isEmpty())
+        settings.remove(QString::fromLatin1(HostKey));
+    else
+        settings.setValue(QString::fromLatin1(HostKey), host);
     const QString port = m_port->text().trimmed();
     int pos = 0;
     QString checked = port;

@@ -16,7 +16,7 @@ class PropSheet;
 // web site go out. It keeps the user's proxy choice in the settings group
 // "WebUpdate", which the plug-ins' transfers read:
 //   "ProxyChoice"  0 no proxy, 1 the system's proxy settings, 2 manual
-//   "ProxyHost"    host name of the manual proxy
+//   "ProxyHost"    host name of the manual proxy (absent when none was given)
 //   "ProxyPort"    its port (absent when none was given)
 // Loads on PropSheetEvent 1000, stores on 1004.
 class ORBHOSTGUI_EXPORT VantorUpdatePage : public QWidget

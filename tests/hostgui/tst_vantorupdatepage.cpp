@@ -116,6 +116,7 @@ void TestVantorUpdatePage::apply_data()
 
     QTest::newRow("manual host and port") << "-|-|-" << "manual" << " proxy.lan " << "3128" << "2|proxy.lan|3128";
     QTest::newRow("manual without port drops the old port") << "2|old|80" << "manual" << "h" << "" << "2|h|-";
+    QTest::newRow("manual without host") << "2|old|80" << "manual" << " " << "80" << "2|-|80";
     QTest::newRow("port out of range is not stored") << "-|-|-" << "manual" << "h" << "99999" << "2|h|-";
     QTest::newRow("no proxy keeps the manual entry") << "2|h|80" << "none" << "x" << "1" << "0|h|80";
     QTest::newRow("system") << "0|-|-" << "system" << "" << "" << "1|-|-";
