@@ -5,11 +5,11 @@
 #include "ui/SendClipDlg.h"
 #include "ui/SendToClipDlg.h"
 
-#include "host/MsgManData.h"
 #include "transmit/UserNotice.h"
 
 #include "host/FileSupervisor.h"
 #include "host/InstanceTable.h"
+#include "host/MsgManData.h"
 #include "host/String.h"
 #include "host/gui/Dialog.h"
 
