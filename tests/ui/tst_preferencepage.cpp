@@ -5,6 +5,7 @@
 #include "host/gui/PropSheet.h"
 #include "host/gui/PropSheetEvent.h"
 #include "ui/DataCollectionPropPageImpl.h"
+#include "transmit/DataCollectionEmail.h"
 #include "ui/PropPageCreator.h"
 
 #include <QtTest>
@@ -15,7 +16,7 @@ class TestPreferencePage : public QObject
 {
     Q_OBJECT
 private Q_SLOTS:
-    void initTestCase() { m_env.reset(new CorvidTest::Environment); }
+    void initTestCase();
     void init() { m_env->clearSettings(); }
     void request_data();
     void request();
@@ -43,6 +44,16 @@ CrvC_DataCollectionPropPageImpl *showCorvidPage(Gui::Clip::PropSheet &sheet)
 }
 
 } // namespace
+
+void TestPreferencePage::initTestCase()
+{
+    m_env.reset(new CorvidTest::Environment);
+    // Two mail programs on the path, so that the page has a list to show.
+    const QString bin = m_env->home() + QLatin1String("/bin");
+    QVERIFY(CorvidTest::writeFile(bin + QLatin1String("/mozilla"), "#!/bin/sh\n"));
+    QVERIFY(CorvidTest::writeFile(bin + QLatin1String("/thunderbird"), "#!/bin/sh\n"));
+    qputenv("PATH", QFile::encodeName(bin) + ':' + qgetenv("PATH"));
+}
 
 void TestPreferencePage::request_data()
 {
@@ -100,12 +111,14 @@ void TestPreferencePage::loadAndApply_data()
     QTest::addColumn<bool>("switchMethod");
     QTest::addColumn<bool>("collectShown");
     QTest::addColumn<QVariant>("useSslAfter"); // invalid: not written
+    QTest::addColumn<bool>("savedTool");       // the second program is remembered
 
     const QVariant none;
-    QTest::newRow("defaults, unchanged") << none << QByteArray() << false << true << none;
+    QTest::newRow("defaults, unchanged") << none << QByteArray() << false << true << none << false;
     QTest::newRow("installation switched off")
-        << none << QByteArray("collectusagestatistics=false\n") << false << false << none;
-    QTest::newRow("upload to e-mail") << QVariant(true) << QByteArray() << true << true << QVariant(false);
+        << none << QByteArray("collectusagestatistics=false\n") << false << false << none << false;
+    QTest::newRow("upload to e-mail") << QVariant(true) << QByteArray() << true << true << QVariant(false) << false;
+    QTest::newRow("program remembered") << QVariant(false) << QByteArray() << false << true << QVariant(false) << true;
 }
 
 void TestPreferencePage::loadAndApply()
@@ -114,7 +127,12 @@ void TestPreferencePage::loadAndApply()
     QFETCH(QByteArray, installFile);
     QFETCH(bool, switchMethod);
     QFETCH(bool, collectShown);
+    QFETCH(bool, savedTool);
     store(CrvC_Settings::UseSSL, useSsl);
+    const QStringList tools = CrvC_DataCollectionEmail().emailTools();
+    QVERIFY(tools.size() >= 2);
+    if (savedTool)
+        store(CrvC_Settings::SelectedEmailTool, tools.at(1));
     QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), installFile));
 
     Gui::Clip::PropSheet sheet;
@@ -129,7 +147,9 @@ void TestPreferencePage::loadAndApply()
     // The list as the e-mail sender offers it, the preferred program last and current.
     const QStringList offered = CrvC_PreferenceValues::mailListOrder(page->emailToolNames());
     QCOMPARE(page->selectEmailTool->count(), offered.size());
-    QCOMPARE(page->selectEmailTool->currentIndex(), offered.size() - 1);
+    QCOMPARE(page->emailToolNames(), tools);
+    QCOMPARE(page->selectEmailTool->currentText(), savedTool ? tools.at(1) : tools.first());
+    QCOMPARE(page->selectEmailTool->itemText(offered.size() - 1), tools.first());
 
     // Shown again: the list does not grow.
     sheet.showItem(0);
@@ -140,9 +160,10 @@ void TestPreferencePage::loadAndApply()
     QCOMPARE(page->selectEmailTool->isEnabled(), ssl == switchMethod);
     sheet.apply();
     QTEST(stored(CrvC_Settings::UseSSL), "useSslAfter");
+    // With none remembered, the preferred program shown is stored.
+    QCOMPARE(stored(CrvC_Settings::SelectedEmailTool), QVariant(savedTool ? tools.at(1) : tools.first()));
     QCOMPARE(stored(CrvC_Settings::CollectDeviceUsage), QVariant(collectShown));
     QCOMPARE(stored(CrvC_Settings::DontShowSendProgressDlg), QVariant(false));
-    QVERIFY(QDateTime::fromString(stored(CrvC_Settings::CorvidTimeStamp).toString(), Qt::ISODate).isValid());
     QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), QByteArray()));
 }
 
