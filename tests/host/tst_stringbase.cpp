@@ -10,8 +10,6 @@ class TestStringBase : public QObject
 private Q_SLOTS:
     void proxyCleanUp_data();
     void proxyCleanUp();
-    void tokens_data();
-    void tokens();
     void replace_data();
     void replace();
 };
@@ -41,33 +39,6 @@ void TestStringBase::proxyCleanUp()
     QCOMPARE(QString::fromStdString(s.str()), expected);
 }
 
-void TestStringBase::tokens_data()
-{
-    QTest::addColumn<QString>("input");
-    QTest::addColumn<QString>("delimiters");
-    QTest::addColumn<int>("mode");
-    QTest::addColumn<QStringList>("expected");
-    QTest::newRow("any of, empty tokens skipped") << "a,,b;c" << ",;" << 0 << QStringList{"a", "b", "c"};
-    QTest::newRow("whole delimiter") << "aXYbXcXY" << "XY" << 1 << QStringList{"a", "bXc"};
-    QTest::newRow("no delimiter present") << "abc" << "|" << 0 << QStringList{"abc"};
-    QTest::newRow("empty delimiter text") << "abc" << "" << 1 << QStringList{"abc"};
-}
-
-void TestStringBase::tokens()
-{
-    QFETCH(QString, input);
-    QFETCH(QString, delimiters);
-    QFETCH(int, mode);
-    const StringBase s(input.toStdString());
-    QStringList tokens;
-    std::size_t pos = 0, begin = 0, end = 0;
-    while (s.NextTokenRange(StringBase(delimiters.toStdString()), StringBase::TokenMode(mode), pos,
-                            begin, end))
-        tokens << QString::fromStdString(s.str().substr(begin, end - begin));
-    QFETCH(QStringList, expected);
-    QCOMPARE(tokens, expected);
-}
-
 void TestStringBase::replace_data()
 {
     QTest::addColumn<QString>("input");
@@ -92,7 +63,6 @@ void TestStringBase::replace()
     QCOMPARE(s.Replace(from.toStdString(), to.toStdString()), count);
     QCOMPARE(QString::fromStdString(s.str()), expected);
 }
-
 
 QTEST_GUILESS_MAIN(TestStringBase)
 #include "tst_stringbase.moc"
