@@ -10,6 +10,7 @@
 #include "host/project/OrbProject.h"
 #include "project/ProjectDataManager.h"
 
+#include <QRegularExpression>
 #include <QtTest>
 
 using Gui::Clip::String;
@@ -42,34 +43,6 @@ private:
 };
 
 namespace {
-
-QString cell(const char *tag, const QString &text)
-{
-    return QStringLiteral("<%1>%2</%1>").arg(QLatin1String(tag), text);
-}
-
-QString design(const QString &name, const QString &value)
-{
-    return cell("dtag-design-property-name", name) + QLatin1Char('\t')
-           + cell("dtag-design-property-value", value);
-}
-
-QString partitions(int count)
-{
-    return QLatin1String("Partitions count\t") + cell("dtag-partitions-count", QString::number(count));
-}
-
-QString source(const QString &type, int count)
-{
-    return cell("dtag-design-source-type-name", type) + QLatin1Char('\t')
-           + cell("dtag-design-source-type-count", QString::number(count));
-}
-
-QString process(const QString &name, const QString &value)
-{
-    return cell("dtag-process-property-name", name) + QLatin1Char('\t')
-           + cell("dtag-process-property-value", value);
-}
 
 QByteArray projectFile(const QByteArray &properties, const QByteArray &sources = QByteArray(),
                         const QByteArray &partitionList = QByteArray(),
@@ -159,8 +132,9 @@ QStringList TestProjectDataManager::collectPairs()
     ProjectDataManager::PairList pairs;
     ProjectDataManager::collectProjectProperties(pairs);
     QStringList result;
+    static const QRegularExpression tag(QStringLiteral("<[^>]*>"));
     for (const ProjectDataManager::Pair &pair : pairs)
-        result << String::convert(pair.first) + QLatin1Char('\t') + String::convert(pair.second);
+        result << QString(String::convert(pair.first) + QLatin1Char('\t') + String::convert(pair.second)).remove(tag);
     return result;
 }
 
@@ -177,26 +151,26 @@ QStringList TestProjectDataManager::debugLines() const
 void TestProjectDataManager::collect_data()
 {
     QTest::addColumn<QByteArray>("contents");
-    QTest::addColumn<QStringList>("expected");
+    QTest::addColumn<QStringList>("expected"); // name<TAB>value, without the mark-up
     QTest::addColumn<QStringList>("diagnostics"); // among the debug lines
 
     QTest::newRow("only the synthesis tool has a template")
         << projectFile("<property name='PROP_Synthesis_Tool' value='Synth (VHDL/Verilog)'/>")
-        << QStringList{design("PROP_Synthesis_Tool", "Synth (VHDL/Verilog)"), partitions(0)}
+        << QStringList{"PROP_Synthesis_Tool\tSynth (VHDL/Verilog)", "Partitions count\t0"}
         << QStringList{"Failed to get template for Property PROP_Simulator\n",
                        "Failed to get template for Property PROP_UseTraceHint\n"};
 
     QTest::newRow("value-less design property, decoded text")
         << projectFile("<property name='PROP_Enable_Incremental_Messaging'/>"
                        "<property name='PROP_Synthesis_Tool' value='Synth &amp; Co'/>")
-        << QStringList{design("PROP_Synthesis_Tool", "Synth & Co"), partitions(0)}
+        << QStringList{"PROP_Synthesis_Tool\tSynth & Co", "Partitions count\t0"}
         << QStringList{"Failed to get Property Instance for PROP_Enable_Incremental_Messaging\n"};
 
     QTest::newRow("source types from the suffix")
         << projectFile("",
                        "<file path='src/top.vhd'/><file path='src/pwm.v'/>"
                        "<file path='src/debounce.vhdl' type='VHDL'/><file path='doc/notes.txt'/>")
-        << QStringList{partitions(0), source("VHDL", 2), source("Verilog", 1)} << QStringList();
+        << QStringList{"Partitions count\t0", "VHDL\t2", "Verilog\t1"} << QStringList();
 
     QTest::newRow("filters select the process properties")
         << projectFile("<property name='PROP_Synthesis_Tool' value='Synth' enabled='false'/>"
@@ -209,15 +183,15 @@ void TestProjectDataManager::collect_data()
                        "<filter key='SYNTHESIS_TOOL' value='Synth'/><filter key='SPEED' value='-2'/></processProperty>"
                        "<processProperty name='G' value='g'><filter key='SIMULATOR_TOOL' value='OSim'/>"
                        "<filter key='TLMT' value='HDL'/></processProperty>")
-        << QStringList{design("PROP_Synthesis_Tool", "Synth"), design("PROP_Simulator", "OSim"),
-                       partitions(0), process("E", "e"), process("F", "f")}
+        << QStringList{"PROP_Synthesis_Tool\tSynth", "PROP_Simulator\tOSim",
+                       "Partitions count\t0", "E\te", "F\tf"}
         << QStringList();
 
     QTest::newRow("entries without an instance or with an empty value")
         << projectFile("", "", "",
                        "<processProperty id='z.id' name='Z'/>"
                        "<processProperty name='W' value=''/>")
-        << QStringList{partitions(0), process("W", "")}
+        << QStringList{"Partitions count\t0", "W\t"}
         << QStringList{"NULL iPropInstance: z.id\n"};
 }
 
@@ -285,8 +259,8 @@ void TestProjectDataManager::fileManagerFailures()
     const QStringList pairs = collectPairs();
     CitP::InstanceTable::RegisterInstance(GuiI::IProjectManager::serviceId(), service);
 
-    QCOMPARE(pairs, (QStringList{design("PROP_Simulator", "OSim"), partitions(1),
-                                 process("PROP_MapEffort", "High")}));
+    QCOMPARE(pairs, (QStringList{"PROP_Simulator\tOSim", "Partitions count\t1",
+                                 "PROP_MapEffort\tHigh"}));
     std::vector<Port_MsgManData::Message> errors;
     for (const Port_MsgManData::Message &m : m_messages) {
         if (m.kind == Port_MsgManData::Error)

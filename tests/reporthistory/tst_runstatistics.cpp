@@ -16,28 +16,6 @@ const QString frameOpening = QStringLiteral(
     "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=8><B>Software Quality</B></TD></TR>"
     "<TR ALIGN=LEFT><TD COLSPAN=8><B>Run Statistics</B></TD></TR>");
 const QString frameClosing = QStringLiteral("</dtag-section></TABLE>");
-const QString headerRow = QStringLiteral(
-    "<TR BGCOLOR='#FFFF99'><TD>Tool</TD><TD>Runs</TD><TD>Completed</TD><TD>Failed</TD>"
-    "<TD>Cancelled</TD><TD>Total Time (s)</TD><TD>Average Time (s)</TD><TD>Last Run</TD></TR>");
-
-QString toolRow(const QString &tool, const QStringList &values)
-{
-    static const char *const tags[] = {"count", "completed", "failed", "cancelled",
-                                       "total-seconds", "average-seconds", "last-date"};
-    QString row = QLatin1String("<TR><TD><dtag-run-tool>") + tool + QLatin1String("</dtag-run-tool></TD>");
-    for (int i = 0; i < values.size(); ++i) {
-        const QString tag = QLatin1String("dtag-run-") + QLatin1String(tags[i]);
-        row += QLatin1String("<TD><") + tag + QLatin1Char('>') + values.at(i) + QLatin1String("</")
-               + tag + QLatin1String("></TD>");
-    }
-    return row + QLatin1String("</TR>\n");
-}
-
-QString framed(const QString &rows)
-{
-    return frameOpening + QLatin1Char('\n') + headerRow + QLatin1Char('\n') + rows + frameClosing;
-}
-
 // A stand-in reader that answers a fixed text.
 class FixedReader final : public CitP::RefObject, public UtilC::IRunStatisticsReader
 {
@@ -109,7 +87,7 @@ void tst_RunStatistics::cleanup()
 void tst_RunStatistics::readerLibrary_data()
 {
     QTest::addColumn<QByteArray>("records");
-    QTest::addColumn<QString>("expected");
+    QTest::addColumn<QString>("expected"); // the table's rows, as cell texts; null: no table
 
     QTest::newRow("no records file") << QByteArray() << QString();
     QTest::newRow("comments and blank lines only")
@@ -118,7 +96,7 @@ void tst_RunStatistics::readerLibrary_data()
     QTest::newRow("latest start wins, in any order")
         << QByteArray("map 2025-05-01T00:00:00 1 completed\n"
                       "map 2024-12-31T23:59:59 2 completed\n")
-        << framed(toolRow("map", {"2", "2", "0", "0", "3", "1.5", "2025-05-01"}));
+        << "map|2|2|0|0|3|1.5|2025-05-01|";
     QTest::newRow("lines that are no record are skipped")
         << QByteArray("map 2025-13-01T00:00:00 5 completed\n"
                       "map 2025-03-03T09:12:40 -5 completed\n"
@@ -129,13 +107,13 @@ void tst_RunStatistics::readerLibrary_data()
                       "map 2025-03-03T09:12:40 5\n"
                       "map yesterday 5 completed\n"
                       "par 2025-03-03T09:12:40 7 failed\n")
-        << framed(toolRow("par", {"1", "0", "1", "0", "7", "7.0", "2025-03-03"}));
+        << "par|1|0|1|0|7|7.0|2025-03-03|";
     QTest::newRow("indentation, tabs, CRLF and extra fields")
         << QByteArray("\t par\t2025-03-03T09:12:40Z   7  completed  exit=0\r\n")
-        << framed(toolRow("par", {"1", "1", "0", "0", "7", "7.0", "2025-03-03"}));
+        << "par|1|1|0|0|7|7.0|2025-03-03|";
     QTest::newRow("mark-up in tool names is escaped")
         << QByteArray("<b>&x 2025-03-03T09:12:40 0 completed\n")
-        << framed(toolRow("&lt;b&gt;&amp;x", {"1", "1", "0", "0", "0", "0.0", "2025-03-03"}));
+        << "&lt;b&gt;&amp;x|1|1|0|0|0|0.0|2025-03-03|";
     QTest::newRow("binary file") << QByteArray("\x7f" "ELF\x02\x01\x01\x00\x00\xff\xfe\n\x00\x01", 14)
                                  << QString();
 }
@@ -148,7 +126,12 @@ void tst_RunStatistics::readerLibrary()
     const QString project = path(QString::fromLatin1(QTest::currentDataTag()).replace(' ', '_') + ".orb");
     if (!records.isEmpty())
         QVERIFY(CorvidTest::writeFile(project + ".runs", records));
-    QCOMPARE(CrvC_RunStatistics::runStatisticsSection(project), expected);
+    const QString section = CrvC_RunStatistics::runStatisticsSection(project);
+    QCOMPARE(section.isEmpty(), expected.isNull());
+    if (!section.isEmpty())
+        QCOMPARE(CorvidTest::cellText(section),
+                 "Software Quality|Run Statistics|Tool|Runs|Completed|Failed|Cancelled|"
+                 "Total Time (s)|Average Time (s)|Last Run|" + expected);
 }
 
 void tst_RunStatistics::readerLibraryWithoutProject()
