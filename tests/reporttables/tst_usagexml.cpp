@@ -42,40 +42,10 @@ QString readAs(const QString &items)
     return QLatin1String("device/g: ") + items + QLatin1String("\ncounts 0 0");
 }
 
-const QString TableHead = QStringLiteral(
-    "&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
-    "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=4><B>Device Usage Statistics</B></TD></TR>\n"
-    "<TR ALIGN=CENTER BGCOLOR='#FFFF99'><TD><B>Macro Statistics</B></TD><TD><B>Miscellaneous "
-    "Statistics</B></TD><TD><B>Net Statistics</B></TD><TD><B>Site Usage</B></TD></TR>"
-    "<TR VALIGN=TOP>\n");
-const QString EmptyTables = TableHead
-    + QStringLiteral("<TD>&nbsp;</TD>\n<TD>&nbsp;</TD><TD>&nbsp;</TD>\n<TD>&nbsp;</TD>\n"
-                     "</TR></TABLE>");
-
-QString head(const QString &name)
-{
-    return QLatin1String("<dtag-group><dtag-group-name name=\"") + name + QLatin1String("\">")
-        + name + QLatin1String("</dtag-group-name>\n");
-}
-
-QString list(const QStringList &items)
-{
-    return QLatin1String("<UL>\n<LI>") + items.join(QLatin1String("</LI>\n<LI>"))
-        + QLatin1String("</LI>\n</UL>\n");
-}
-
-const QString End = QStringLiteral("</dtag-group>\n");
-const QString Break = QStringLiteral("</TD><TD>\n");
-
-QString spreadTable(const QString &title, const QString &groups)
-{
-    return QLatin1String("&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
-                         "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=4><B>")
-        + title
-        + QLatin1String("</B></TD></TR><TR VALIGN=TOP>\n<dtag-section name=\"ReportConfigData\">\n"
-                        "<TD>\n")
-        + groups + QLatin1String("</TD>\n</dtag-section>\n</TR></TABLE>");
-}
+// The cell texts of the device usage table, and of that table when empty.
+const QString Heads = QStringLiteral(
+    "Device Usage Statistics|Macro Statistics|Miscellaneous Statistics|Net Statistics|Site Usage|");
+const QString EmptyTables = Heads + QStringLiteral("||||");
 
 QStringList items(int count)
 {
@@ -205,7 +175,7 @@ private Q_SLOTS:
         CrvC_ReportData data;
         QVERIFY(!CrvC_UsageXml::readUsageXml(write(xml), data));
         QCOMPARE(dump(data), QStringLiteral("counts 0 0"));
-        QCOMPARE(tables(data), EmptyTables);
+        QCOMPARE(CorvidTest::cellText(tables(data)), EmptyTables);
     }
 
     void failedReadKeepsTables()
@@ -233,85 +203,55 @@ private Q_SLOTS:
         QCOMPARE(dump(data), readAs("<dtag-item1>n=1</dtag-item1>"));
     }
 
-    void deviceUsageTable_data()
+    // The tables' cell texts for groups of one item each ("g=" lists a
+    // group of that many items in the configuration and pin data).
+    void layout_data()
     {
         QTest::addColumn<QStringList>("designGroups");
         QTest::addColumn<QStringList>("deviceGroups");
+        QTest::addColumn<QList<int>>("spreadGroups"); // "g0", "g1", ... in both spread tables
+        QTest::addColumn<int>("count");
         QTest::addColumn<QString>("cells");
 
         QTest::newRow("every NetStatistics group opens a cell")
             << QStringList({"NetStatisticsA", "netstatisticsB"}) << QStringList({"Sites"})
-            << QLatin1String("<dtag-section name=\"DesignStatistics\">\n<TD>\n") + Break
-                   + head("NetStatisticsA") + list(items(1)) + End + Break
-                   + head("netstatisticsB") + list(items(1)) + End
-                   + QLatin1String("</TD>\n</dtag-section>\n<dtag-section name=\"DeviceUsage\">\n"
-                                   "<TD>\n")
-                   + head("Sites") + list(items(1)) + End + QLatin1String("</TD>\n</dtag-section>\n");
+            << QList<int>() << 0
+            << Heads + "||NetStatisticsA i0=0|netstatisticsB i0=0|Sites i0=0|";
         QTest::newRow("empty name writes no list")
-            << QStringList({""}) << QStringList({""})
-            << QLatin1String("<dtag-section name=\"DesignStatistics\">\n<TD>\n") + head("") + End
-                   + QLatin1String("</TD>\n</dtag-section>\n<dtag-section name=\"DeviceUsage\">\n"
-                                   "<TD>\n")
-                   + head("") + End + QLatin1String("</TD>\n</dtag-section>\n");
+            << QStringList({""}) << QStringList({""}) << QList<int>() << 0 << Heads + "|||";
+        QTest::newRow("spread: limit reached across groups")
+            << QStringList() << QStringList() << QList<int>({1, 1, 1, 3}) << 8
+            << EmptyTables + "Configuration Data|g0 i0=0 g1 i0=0|g2 i0=0 g3 i0=0 i1=1 i2=2||"
+                             "Pin Data|g0 i0=0 g1 i0=0|g2 i0=0 g3 i0=0 i1=1 i2=2||";
+        QTest::newRow("spread: limit not reached")
+            << QStringList() << QStringList() << QList<int>({2, 2}) << 20
+            << EmptyTables + "Configuration Data|g0 i0=0 i1=1 g1 i0=0 i1=1|Pin Data|g0 i0=0 i1=1 g1 i0=0 i1=1|";
+        QTest::newRow("pin data alone")
+            << QStringList() << QStringList() << QList<int>() << 0 << EmptyTables + "Pin Data|p i0=0||";
     }
 
-    void deviceUsageTable()
+    void layout()
     {
         QFETCH(QStringList, designGroups);
         QFETCH(QStringList, deviceGroups);
-        QFETCH(QString, cells);
+        QFETCH(QList<int>, spreadGroups);
+        QFETCH(int, count);
         CrvC_ReportData data;
         for (const QString &name : designGroups)
             data.designStatistics.insert(name, items(1));
         for (const QString &name : deviceGroups)
             data.deviceUsage.insert(name, items(1));
-        QCOMPARE(tables(data), TableHead + QLatin1String("<TD>&nbsp;</TD>\n") + cells
-                                   + QLatin1String("</TR></TABLE>"));
-    }
-
-    void spreadTables_data()
-    {
-        QTest::addColumn<QList<int>>("groupSizes"); // groups "g0", "g1", ...
-        QTest::addColumn<int>("count");
-        QTest::addColumn<QString>("groups");
-
-        QTest::newRow("limit reached across groups")
-            << QList<int>({1, 1, 1, 3}) << 8
-            << head("g0") + list(items(1)) + End + head("g1") + list(items(1)) + Break + End
-                   + head("g2") + list(items(1)) + End + head("g3") + list(items(3)) + Break + End;
-        QTest::newRow("limit not reached") << QList<int>({2, 2}) << 20
-                                                         << head("g0") + list(items(2)) + End
-                                                                + head("g1") + list(items(2)) + End;
-    }
-
-    void spreadTables()
-    {
-        QFETCH(QList<int>, groupSizes);
-        QFETCH(int, count);
-        QFETCH(QString, groups);
-        CrvC_ReportData data;
-        for (int i = 0; i < groupSizes.size(); ++i) {
-            data.reportConfigData.insert(QStringLiteral("g%1").arg(i), items(groupSizes.at(i)));
-            data.reportPinData.insert(QStringLiteral("g%1").arg(i), items(groupSizes.at(i)));
+        for (int i = 0; i < spreadGroups.size(); ++i) {
+            data.reportConfigData.insert(QStringLiteral("g%1").arg(i), items(spreadGroups.at(i)));
+            data.reportPinData.insert(QStringLiteral("g%1").arg(i), items(spreadGroups.at(i)));
         }
-        data.reportConfigData.insert(QString(), items(5)); // no name: left out
-        data.reportConfigDataCount = count;
-        data.reportPinDataCount = count;
-        QCOMPARE(tables(data), EmptyTables + QLatin1Char('\n')
-                                   + spreadTable(QStringLiteral("Configuration Data"), groups)
-                                   + QLatin1Char('\n')
-                                   + spreadTable(QStringLiteral("Pin Data"), groups));
+        if (!spreadGroups.isEmpty())
+            data.reportConfigData.insert(QString(), items(5)); // no name: left out
+        else if (QTest::currentDataTag() == QLatin1String("pin data alone"))
+            data.reportPinData.insert(QStringLiteral("p"), items(1));
+        data.reportConfigDataCount = data.reportPinDataCount = count;
+        QTEST(CorvidTest::cellText(tables(data)), "cells");
     }
-
-    void onlyPinData()
-    {
-        CrvC_ReportData data;
-        data.reportPinData.insert(QStringLiteral("p"), items(1));
-        QCOMPARE(tables(data), EmptyTables + QLatin1Char('\n')
-                                   + spreadTable(QStringLiteral("Pin Data"),
-                                                 head("p") + list(items(1)) + Break + End));
-    }
-
 };
 
 QTEST_GUILESS_MAIN(tst_UsageXml)
