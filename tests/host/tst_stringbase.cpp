@@ -8,37 +8,12 @@ class TestStringBase : public QObject
 {
     Q_OBJECT
 private Q_SLOTS:
-    void proxyCleanUp_data();
-    void proxyCleanUp();
     void replace_data();
     void replace();
 };
 
-// The clean-up applied to a discovered proxy text: first ";" token, then the
-// first token delimited by "PROXY", then blanks trimmed.
-void TestStringBase::proxyCleanUp_data()
-{
-    QTest::addColumn<QString>("input");
-    QTest::addColumn<QString>("expected");
-    QTest::newRow("script answer") << "PROXY h:8080; DIRECT" << "h:8080";
-    QTest::newRow("proxy list") << "h1:8080;h2:8080" << "h1:8080";
-    QTest::newRow("plain") << "h:8080" << "h:8080";
-    QTest::newRow("tabs and blanks") << "PROXY \t h:3128 \t;x" << "h:3128";
-    QTest::newRow("empty") << "" << "";
-    QTest::newRow("only delimiters") << ";;;" << "";
-}
-
-void TestStringBase::proxyCleanUp()
-{
-    QFETCH(QString, input);
-    StringBase s(input.toStdString());
-    s.Reduce(";", StringBase::WholeDelimiter);
-    s.Reduce("PROXY", StringBase::WholeDelimiter);
-    s.Trim(" \t", StringBase::TrimBoth);
-    QFETCH(QString, expected);
-    QCOMPARE(QString::fromStdString(s.str()), expected);
-}
-
+// Replace() frames the run statistics table; a replacement that contains
+// the pattern, or an empty pattern, must not loop.
 void TestStringBase::replace_data()
 {
     QTest::addColumn<QString>("input");
