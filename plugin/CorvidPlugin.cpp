@@ -1,5 +1,6 @@
 #include "CorvidPlugin.h"
 #include "CollectionCycle.h"
+#include "ui/PropPageCreator.h"
 
 #include "host/FileSupervisor.h"
 #include "host/InstanceTable.h"
@@ -101,7 +102,7 @@ int CrvC_CorvidPlugin::getFileSuitability(const Port::StringBase &fileName)
                                                                            : NotSuitable;
 }
 
-void CrvC_CorvidPlugin::onDataRequested(Gui::Clip::DataCollector &)
+void CrvC_CorvidPlugin::onDataRequested(Gui::Clip::DataCollector &collector)
 {
-    // The preference item is added by the preference page.
+    CrvC_PropPageCreator::addPreferenceItem(collector);
 }

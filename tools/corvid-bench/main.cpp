@@ -11,12 +11,14 @@
 
 #include "host/Version.h"
 #include "report/ReportBuilder.h"
+#include "ui/DataCollectionDialog.h"
 
-#include <QCoreApplication>
+#include <QApplication>
 #include <QDir>
 #include <QElapsedTimer>
 #include <QFile>
 #include <QFileInfo>
+#include <QPushButton>
 #include <QTemporaryDir>
 
 #include <sys/resource.h>
@@ -211,7 +213,11 @@ long peakRssKiB()
 
 int main(int argc, char **argv)
 {
-    QCoreApplication app(argc, argv);
+    // The review dialog is timed too; without a display it is drawn offscreen.
+    if (qEnvironmentVariableIsEmpty("QT_QPA_PLATFORM") && qEnvironmentVariableIsEmpty("DISPLAY")
+        && qEnvironmentVariableIsEmpty("WAYLAND_DISPLAY"))
+        qputenv("QT_QPA_PLATFORM", "offscreen");
+    QApplication app(argc, argv);
     double scale = 1.0;
     int steps = 4;
     QString keep;
@@ -231,8 +237,8 @@ int main(int argc, char **argv)
 
     QTemporaryDir temp;
     const QString root = keep.isEmpty() ? temp.path() : QFileInfo(keep).absoluteFilePath();
-    std::printf("%-6s %12s %12s %10s %10s %12s %12s\n", "step", "cmd lines", "usage items",
-                "cores", "help", "input MB", "build ms");
+    std::printf("%-6s %12s %12s %10s %10s %12s %12s %12s\n", "step", "cmd lines", "usage items",
+                "cores", "help", "input MB", "build ms", "dialog ms");
     for (int step = 1; step <= steps; ++step) {
         const Sizes sizes = sizesFor(scale * step / steps);
         const QString dir = root + QLatin1String("/step") + QString::number(step);
@@ -247,16 +253,29 @@ int main(int argc, char **argv)
 
         QElapsedTimer timer;
         timer.start();
-        CrvC_ReportBuilder builder;
+        CrvC_DataCollectionDialog dialog;
+        CrvC_ReportBuilder &builder = dialog.builder();
         builder.createReport(QString(), QStringLiteral("bench"), QStringLiteral("Xc6"));
         const qint64 ms = timer.elapsed();
+
+        // The review dialog after the build: the page into the Contents tab,
+        // the dialog on screen, and a click on "Verify Contents" answered
+        // with the tab drawn.
+        timer.restart();
+        dialog.showContents();
+        dialog.show();
+        app.processEvents();
+        dialog.verifyButton()->click();
+        dialog.grab();
+        const qint64 dialogMs = timer.elapsed();
+        dialog.hide();
         if (!builder.written()) {
             std::fprintf(stderr, "corvid-bench: the page was not written\n");
             return 1;
         }
-        std::printf("%-6d %12d %12d %10d %10d %12.1f %12lld\n", step, sizes.commandLines,
+        std::printf("%-6d %12d %12d %10d %10d %12.1f %12lld %12lld\n", step, sizes.commandLines,
                     sizes.usageItems, sizes.coreInstances, sizes.helpEntries, bytes / 1048576.0,
-                    static_cast<long long>(ms));
+                    static_cast<long long>(ms), static_cast<long long>(dialogMs));
         std::fflush(stdout);
     }
     std::printf("peak resident memory: %.1f MB; page of the last step: %.1f MB\n",
