@@ -16,6 +16,7 @@ const QString frameOpening = QStringLiteral(
     "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=8><B>Software Quality</B></TD></TR>"
     "<TR ALIGN=LEFT><TD COLSPAN=8><B>Run Statistics</B></TD></TR>");
 const QString frameClosing = QStringLiteral("</dtag-section></TABLE>");
+
 // A stand-in reader that answers a fixed text.
 class FixedReader final : public CitP::RefObject, public UtilC::IRunStatisticsReader
 {

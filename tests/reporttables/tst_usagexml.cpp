@@ -203,8 +203,8 @@ private Q_SLOTS:
         QCOMPARE(dump(data), readAs("<dtag-item1>n=1</dtag-item1>"));
     }
 
-    // The tables' cell texts for groups of one item each ("g=" lists a
-    // group of that many items in the configuration and pin data).
+    // The tables' cell texts: design and device groups of one item each,
+    // and groups "g0", "g1", ... of the given sizes in both spread tables.
     void layout_data()
     {
         QTest::addColumn<QStringList>("designGroups");
@@ -226,8 +226,6 @@ private Q_SLOTS:
         QTest::newRow("spread: limit not reached")
             << QStringList() << QStringList() << QList<int>({2, 2}) << 20
             << EmptyTables + "Configuration Data|g0 i0=0 i1=1 g1 i0=0 i1=1|Pin Data|g0 i0=0 i1=1 g1 i0=0 i1=1|";
-        QTest::newRow("pin data alone")
-            << QStringList() << QStringList() << QList<int>() << 0 << EmptyTables + "Pin Data|p i0=0||";
     }
 
     void layout()
@@ -247,10 +245,15 @@ private Q_SLOTS:
         }
         if (!spreadGroups.isEmpty())
             data.reportConfigData.insert(QString(), items(5)); // no name: left out
-        else if (QTest::currentDataTag() == QLatin1String("pin data alone"))
-            data.reportPinData.insert(QStringLiteral("p"), items(1));
         data.reportConfigDataCount = data.reportPinDataCount = count;
         QTEST(CorvidTest::cellText(tables(data)), "cells");
+    }
+
+    void pinDataAlone()
+    {
+        CrvC_ReportData data;
+        data.reportPinData.insert(QStringLiteral("p"), items(1));
+        QCOMPARE(CorvidTest::cellText(tables(data)), EmptyTables + "Pin Data|p i0=0||");
     }
 };
 
