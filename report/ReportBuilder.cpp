@@ -9,6 +9,7 @@
 #include "VersionSection.h"
 
 #include "host/AutoRelease.h"
+#include "host/Identifier.h"
 #include "host/InstanceTable.h"
 #include "host/ProjectManager.h"
 #include "host/String.h"
@@ -16,27 +17,142 @@
 #include "project/CorvidSettings.h"
 
 #include <QCoreApplication>
+#include <QFileInfo>
 #include <QSaveFile>
-#include <QStringConverter>
+
+#include <future>
+#include <new>
+#include <system_error>
 
 const char *const CrvC_ReportBuilder::ReportFileName = "device_usage_statistics.html";
 
+// About 4 MB of text: far more than a reader scrolls through, and a text
+// view stays responsive with it.
+const qsizetype CrvC_ReportBuilder::PageTextLimit = 2 * 1024 * 1024;
+
 namespace {
 
-QString tr(const char *text)
+// The heading's texts are translated in the review dialog's context.
+const char *const HeadingContext = "CrvC_DataCollectionDialog";
+const char *const HeadingTexts[] = {
+    QT_TRANSLATE_NOOP("CrvC_DataCollectionDialog",
+                      "This HTML page displays the device usage statistics that will be sent to "
+                      "Vantor. "),
+    QT_TRANSLATE_NOOP("CrvC_DataCollectionDialog",
+                      "The file also contains predefined XML tags used to simplify processing."),
+    QT_TRANSLATE_NOOP("CrvC_DataCollectionDialog",
+                      "<BR>&nbsp;<BR>Please verify the contents are okay to send to "
+                      "Vantor!<BR>&nbsp;<BR><HR>&nbsp;<BR>"),
+};
+
+// Restores the busy cursor however the build ends.
+class BusyCursor
 {
-    return QCoreApplication::translate("CrvC_DataCollectionDialog", text);
+public:
+    explicit BusyCursor(const std::function<void(bool)> &setBusy)
+        : m_setBusy(setBusy)
+    {
+        if (m_setBusy)
+            m_setBusy(true);
+    }
+    ~BusyCursor()
+    {
+        if (m_setBusy)
+            m_setBusy(false);
+    }
+    BusyCursor(const BusyCursor &) = delete;
+    BusyCursor &operator=(const BusyCursor &) = delete;
+
+private:
+    const std::function<void(bool)> &m_setBusy;
+};
+
+// Runs `task` on a thread of its own; when no thread can be started, on the
+// thread that asks for the result.
+template<typename Task>
+auto startReader(Task task) -> std::future<decltype(task())>
+{
+    try {
+        return std::async(std::launch::async, task);
+    } catch (const std::system_error &) {
+        return std::async(std::launch::deferred, task);
+    }
 }
 
 } // namespace
 
-CrvC_ReportBuilder::CrvC_ReportBuilder(Environment environment)
-    : m_env(std::move(environment))
+// The page as it is assembled: every line goes to the file at once, as UTF-8
+// with "\n" between lines, and into the kept beginning until that is full.
+class CrvC_ReportBuilder::PageWriter
 {
-    if (!m_env.now)
-        m_env.now = [] { return QDateTime::currentDateTime(); };
-    if (!m_env.newIdentifier)
-        m_env.newIdentifier = &CrvC_Settings::newIdentifier;
+public:
+    PageWriter(const QString &path, QString &text, bool &cut)
+        : m_file(path)
+        , m_text(text)
+        , m_cut(cut)
+    {
+        m_text.clear();
+        m_cut = false;
+        // QSaveFile would replace the link's target; the page goes only
+        // where the report path itself says.
+        if (!QFileInfo(path).isSymLink())
+            m_open = m_file.open(QIODevice::WriteOnly);
+    }
+
+    void operator()(const QString &line)
+    {
+        if (m_lines++ > 0)
+            add(QStringLiteral("\n"));
+        add(line);
+    }
+
+    // True when the whole page is in place of the previous file.
+    bool commit() { return m_open && m_file.commit(); }
+
+private:
+    void add(const QString &text)
+    {
+        if (m_open) {
+            const QByteArray bytes = text.toUtf8();
+            if (m_file.write(bytes) != bytes.size())
+                m_open = false; // QSaveFile keeps the old file; commit fails
+        }
+        if (m_cut)
+            return;
+        const qsizetype room = PageTextLimit - m_text.size();
+        if (text.size() <= room) {
+            m_text += text;
+            return;
+        }
+        qsizetype keep = room;
+        // Never keep half of a surrogate pair.
+        if (keep > 0 && text.at(keep - 1).isHighSurrogate())
+            --keep;
+        m_text += QStringView(text).left(keep);
+        m_cut = true;
+    }
+
+    QSaveFile m_file;
+    bool m_open = false;
+    qsizetype m_lines = 0;
+    QString &m_text;
+    bool &m_cut;
+};
+
+CrvC_ReportBuilder::Environment CrvC_ReportBuilder::withDefaults(Environment environment)
+{
+    if (!environment.now)
+        environment.now = [] { return QDateTime::currentDateTime(); };
+    if (!environment.newIdentifier)
+        environment.newIdentifier = &Port::Identifier::newIdentifier;
+    if (!environment.randomId)
+        environment.randomId = &CrvC_Settings::randomId;
+    return environment;
+}
+
+CrvC_ReportBuilder::CrvC_ReportBuilder(Environment environment)
+    : m_env(withDefaults(std::move(environment)))
+{
     m_data.reportPath = projectFilePath(QString::fromLatin1(ReportFileName));
 }
 
@@ -84,6 +200,7 @@ void CrvC_ReportBuilder::buildReport(const QString &projectFileArg, QString desi
     m_data.projectFile = projectFileArg.endsWith(QLatin1String(".orb"), Qt::CaseInsensitive)
                              ? projectFileArg
                              : projectFileArg + QLatin1String(".orb");
+    m_data.projectGiven = !projectFileArg.isEmpty();
 
     if (designName.isEmpty() && m_env.askDesignName) {
         QString entered;
@@ -91,57 +208,108 @@ void CrvC_ReportBuilder::buildReport(const QString &projectFileArg, QString desi
             designName = entered.trimmed();
     }
 
-    if (m_env.setBusy)
-        m_env.setBusy(true);
+    m_written = false;
+    BusyCursor busy(m_env.setBusy);
+    try {
+        PageWriter page(m_data.reportPath, m_page, m_pageCut);
+        assemble(designName, page);
+        m_written = page.commit();
+    } catch (const std::bad_alloc &) {
+        // The unfinished page is dropped; the previous file stays.
+        m_written = false;
+        m_pageCut = true;
+    }
+}
+
+void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
+{
+    const QString directory = projectDirectory();
+    const auto inProject = [&directory](const QString &name) {
+        return directory.isEmpty() ? name : directory + QLatin1Char('/') + name;
+    };
+    const QString mapReport = inProject(designName + QLatin1String("_map.ktp"));
+    const QString synthesisReport = inProject(designName + QLatin1String(".snx"));
+    const QString usageXml = inProject(designName + QLatin1String("_usage.xml"));
+    const QString commandLog = inProject(designName + QLatin1String(".cmd_log"));
+    const QString fuseLog = inProject(QStringLiteral("fuse.log"));
+    const QString coresReport = inProject(designName + QLatin1String("_lnkgen.drpt"));
+    const QString parPage = inProject(QStringLiteral("par_usage_statistics.html"));
+    const QString osimPage = inProject(QStringLiteral("osim/osim_usage_statistics.html"));
+
+    // The pure file readers start at once, each on a copy of the fields (the
+    // copies share their contents until a reader adds to them).
+    const CrvC_ReportData start = m_data;
+    auto targetInfo = startReader([start, mapReport] {
+        CrvC_ReportData d = start;
+        CrvC_SynthesisReport::readTargetInfo(mapReport, d);
+        return d;
+    });
+    auto macros = startReader([start, synthesisReport] {
+        CrvC_ReportData d = start;
+        CrvC_SynthesisReport::readMacroStatistics(synthesisReport, d);
+        return d;
+    });
+    auto usage = startReader([start, usageXml] {
+        CrvC_ReportData d = start;
+        CrvC_UsageXml::readUsageXml(usageXml, d);
+        return d;
+    });
+    auto commands = startReader([start, commandLog, fuseLog] {
+        CrvC_ReportData d = start;
+        CrvC_CommandLog::readCommandLog(commandLog, d);
+        CrvC_CommandLog::checkFuseLog(fuseLog, d);
+        return d;
+    });
+    auto help = startReader([] { return CrvC_HelpViewerData().sectionText(); });
+    auto cores = startReader([coresReport] { return CrvC_CoresStatistics().sectionText(coresReport); });
+    auto par = startReader([parPage] { return CrvC_RunStatistics::parUsageSection(parPage); });
+    auto osim = startReader([osimPage] { return CrvC_RunStatistics::osimUsageSection(osimPage); });
 
     const QString fileName = QString::fromLatin1(ReportFileName);
-    QStringList lines;
-    lines.reserve(32);
-    lines << QStringLiteral("<HTML><HEAD><TITLE>Device Usage Statistics Report</TITLE></HEAD>")
-          << QStringLiteral("<BODY TEXT='#000000' BGCOLOR='#FFFFFF' LINK='#0000EE' "
-                            "VLINK='#551A8B' ALINK='#FF0000'>");
-    lines << QLatin1String("<H3>Device Usage Page (") + fileName + QLatin1String(")</H3>")
-                 + tr("This HTML page displays the device usage statistics that will be sent to "
-                      "Vantor. ")
-                 + tr("The file also contains predefined XML tags used to simplify processing.")
-                 + tr("<BR>&nbsp;<BR>Please verify the contents are okay to send to "
-                      "Vantor!<BR>&nbsp;<BR><HR>&nbsp;<BR>");
+    page(QStringLiteral("<HTML><HEAD><TITLE>Device Usage Statistics Report</TITLE></HEAD>"));
+    page(QStringLiteral("<BODY TEXT='#000000' BGCOLOR='#FFFFFF' LINK='#0000EE' "
+                        "VLINK='#551A8B' ALINK='#FF0000'>"));
+    QString heading = QLatin1String("<H3>Device Usage Page (") + fileName + QLatin1String(")</H3>");
+    for (const char *text : HeadingTexts)
+        heading += QCoreApplication::translate(HeadingContext, text);
+    page(heading);
 
-    CrvC_SynthesisReport::readTargetInfo(projectFilePath(designName + QLatin1String("_map.ktp")),
-                                         m_data);
-    lines << CrvC_VersionSection::versionSection(m_data, m_env);
-    CrvC_SynthesisReport::readMacroStatistics(projectFilePath(designName + QLatin1String(".snx")),
-                                              m_data);
-    CrvC_UsageXml::readUsageXml(projectFilePath(designName + QLatin1String("_usage.xml")), m_data);
-    CrvC_CommandLog::readCommandLog(projectFilePath(designName + QLatin1String(".cmd_log")), m_data);
-    CrvC_CommandLog::checkFuseLog(projectFilePath(QStringLiteral("fuse.log")), m_data);
+    // The host, the repository and the settings are asked on this thread,
+    // while the readers work.
+    {
+        const CrvC_ReportData target = targetInfo.get();
+        m_data.targetDevice = target.targetDevice;
+        m_data.targetPackage = target.targetPackage;
+        m_data.targetSpeed = target.targetSpeed;
+    }
+    page(CrvC_VersionSection::versionSection(m_data, m_env));
+    const QString runStatistics = CrvC_RunStatistics::runStatisticsSection(m_data.projectFileToOpen());
+    const QString projectStatistics = CrvC_ProjectStatistics::projectStatisticsSection(
+        m_data.projectFileToOpen(), m_env.now().date());
 
-    CrvC_UsageXml::appendTables(m_data, lines);
+    m_data.macroStatistics = macros.get().macroStatistics;
+    {
+        CrvC_ReportData read = usage.get();
+        m_data.usageXmlPath = read.usageXmlPath;
+        m_data.designStatistics.swap(read.designStatistics);
+        m_data.deviceUsage.swap(read.deviceUsage);
+        m_data.reportConfigData.swap(read.reportConfigData);
+        m_data.reportPinData.swap(read.reportPinData);
+        m_data.reportConfigDataCount = read.reportConfigDataCount;
+        m_data.reportPinDataCount = read.reportPinDataCount;
+    }
+    m_data.commandHistory = commands.get().commandHistory;
+
+    CrvC_Lines tables([&page](const QString &line) { page(line); });
+    CrvC_UsageXml::appendTables(m_data, tables);
 
     if (!m_data.commandHistory.isEmpty())
-        lines << CrvC_CommandLog::commandLineHistorySection(m_data);
-    lines << CrvC_RunStatistics::runStatisticsSection(m_data.projectFile);
-    lines << CrvC_HelpViewerData().sectionText();
-    lines << CrvC_ProjectStatistics::projectStatisticsSection(m_data.projectFile, m_env.now().date());
-    lines << CrvC_CoresStatistics().sectionText(
-        projectFilePath(designName + QLatin1String("_lnkgen.drpt")));
-    lines << CrvC_RunStatistics::parUsageSection(
-        projectFilePath(QStringLiteral("par_usage_statistics.html")));
-    lines << CrvC_RunStatistics::osimUsageSection(
-        projectFilePath(QStringLiteral("osim/osim_usage_statistics.html")));
-    lines << QStringLiteral("</BODY></HTML>");
-
-    m_page = lines.join(QLatin1Char('\n'));
-
-    // Written through a temporary file, so that a failure half-way never
-    // leaves a cut-off page in place of the previous one.
-    m_written = false;
-    QSaveFile file(m_data.reportPath);
-    if (file.open(QIODevice::WriteOnly)) {
-        file.write(m_page.toUtf8());
-        m_written = file.commit();
-    }
-
-    if (m_env.setBusy)
-        m_env.setBusy(false);
+        page(CrvC_CommandLog::commandLineHistorySection(m_data));
+    page(runStatistics);
+    page(help.get());
+    page(projectStatistics);
+    page(cores.get());
+    page(par.get());
+    page(osim.get());
+    page(QStringLiteral("</BODY></HTML>"));
 }
