@@ -20,7 +20,16 @@
 #include <QFileInfo>
 #include <QSaveFile>
 
-#include <future>
+#include <QThread>
+
+#if defined(__GLIBC__)
+#include <malloc.h>
+#endif
+
+#include <atomic>
+#include <exception>
+#include <thread>
+#include <vector>
 #include <new>
 #include <system_error>
 
@@ -67,17 +76,80 @@ private:
     const std::function<void(bool)> &m_setBusy;
 };
 
-// Runs `task` on a thread of its own; when no thread can be started, on the
-// thread that asks for the result.
-template<typename Task>
-auto startReader(Task task) -> std::future<decltype(task())>
+// Hands memory that is free again back to the system: a large build leaves
+// much of it in the heaps of its threads, to no use until the next build.
+void releaseFreedMemory()
 {
-    try {
-        return std::async(std::launch::async, task);
-    } catch (const std::system_error &) {
-        return std::async(std::launch::deferred, task);
-    }
+#if defined(__GLIBC__)
+    malloc_trim(0);
+#endif
 }
+
+// Runs the pure file readers side by side: the calling thread and one worker
+// thread per further processor core (two at most) take the readers in turn,
+// in the order given (largest first). Few threads rather than one per
+// reader: each thread allocates from a heap of its own that keeps what it
+// freed, so every extra thread adds to the peak memory of a build.
+class ReaderPool
+{
+public:
+    explicit ReaderPool(std::vector<std::function<void()>> readers)
+        : m_readers(std::move(readers))
+        , m_failures(m_readers.size())
+    {
+        // The usage XML takes most of the time, the rest fits beside it: more
+        // than two workers would only add heaps.
+        const int workers = qBound(1, QThread::idealThreadCount() - 1, 2);
+        for (int i = 0; i < workers; ++i) {
+            try {
+                m_threads.emplace_back([this] { work(); });
+            } catch (const std::system_error &) {
+                break; // the calling thread reads what no worker takes
+            }
+        }
+    }
+
+    ~ReaderPool() { join(); }
+
+    // Takes part in the reading until every reader is done, then rethrows
+    // the first failure of a reader, in reader order.
+    void finish()
+    {
+        work();
+        join();
+        for (const std::exception_ptr &failure : m_failures) {
+            if (failure)
+                std::rethrow_exception(failure);
+        }
+    }
+
+private:
+    void work()
+    {
+        for (std::size_t i = m_next++; i < m_readers.size(); i = m_next++) {
+            try {
+                m_readers[i]();
+            } catch (...) {
+                m_failures[i] = std::current_exception();
+            }
+            // What a reader needed only on the way may serve the others.
+            releaseFreedMemory();
+        }
+    }
+
+    void join()
+    {
+        for (std::thread &thread : m_threads) {
+            if (thread.joinable())
+                thread.join();
+        }
+    }
+
+    std::vector<std::function<void()>> m_readers;
+    std::vector<std::exception_ptr> m_failures;
+    std::atomic<std::size_t> m_next{0};
+    std::vector<std::thread> m_threads;
+};
 
 } // namespace
 
@@ -106,17 +178,43 @@ public:
         add(line);
     }
 
+    // A line already encoded, as the readers hand back their large sections.
+    void utf8(const QByteArray &line)
+    {
+        if (m_lines++ > 0)
+            add(QStringLiteral("\n"));
+        write(line);
+        if (!m_cut)
+            keep(QString::fromUtf8(line));
+    }
+
     // True when the whole page is in place of the previous file.
     bool commit() { return m_open && m_file.commit(); }
 
 private:
     void add(const QString &text)
     {
-        if (m_open) {
-            const QByteArray bytes = text.toUtf8();
-            if (m_file.write(bytes) != bytes.size())
-                m_open = false; // QSaveFile keeps the old file; commit fails
+        // A long line is encoded a slice at a time rather than copied whole.
+        const qsizetype slice = 1 << 16;
+        QStringView rest(text);
+        while (m_open && !rest.isEmpty()) {
+            qsizetype n = qMin(slice, rest.size());
+            if (n < rest.size() && rest.at(n - 1).isHighSurrogate())
+                ++n;
+            write(rest.left(n).toUtf8());
+            rest = rest.mid(n);
         }
+        keep(text);
+    }
+
+    void write(const QByteArray &bytes)
+    {
+        if (m_open && m_file.write(bytes) != bytes.size())
+            m_open = false; // QSaveFile keeps the old file; commit fails
+    }
+
+    void keep(const QString &text)
+    {
         if (m_cut)
             return;
         const qsizetype room = PageTextLimit - m_text.size();
@@ -219,6 +317,7 @@ void CrvC_ReportBuilder::buildReport(const QString &projectFileArg, QString desi
         m_written = false;
         m_pageCut = true;
     }
+    releaseFreedMemory();
 }
 
 void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
@@ -237,33 +336,27 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
     const QString osimPage = inProject(QStringLiteral("osim/osim_usage_statistics.html"));
 
     // The pure file readers start at once, each on a copy of the fields (the
-    // copies share their contents until a reader adds to them).
+    // copies share their contents until a reader adds to them). The later
+    // sections come back encoded: half the memory while they wait for their
+    // turn.
     const CrvC_ReportData start = m_data;
-    auto targetInfo = startReader([start, mapReport] {
-        CrvC_ReportData d = start;
-        CrvC_SynthesisReport::readTargetInfo(mapReport, d);
-        return d;
+    CrvC_ReportData usage = start, macros = start, commands = start;
+    QByteArray history, help, cores, par, osim;
+    ReaderPool readers({
+        [&] { CrvC_UsageXml::readUsageXml(usageXml, usage); },
+        [&] { cores = CrvC_CoresStatistics().sectionText(coresReport).toUtf8(); },
+        [&] {
+            CrvC_CommandLog::readCommandLog(commandLog, commands);
+            CrvC_CommandLog::checkFuseLog(fuseLog, commands);
+            if (!commands.commandHistory.isEmpty())
+                history = CrvC_CommandLog::commandLineHistorySection(commands).toUtf8();
+            commands.commandHistory.clear();
+        },
+        [&] { help = CrvC_HelpViewerData().sectionText().toUtf8(); },
+        [&] { CrvC_SynthesisReport::readMacroStatistics(synthesisReport, macros); },
+        [&] { par = CrvC_RunStatistics::parUsageSection(parPage).toUtf8(); },
+        [&] { osim = CrvC_RunStatistics::osimUsageSection(osimPage).toUtf8(); },
     });
-    auto macros = startReader([start, synthesisReport] {
-        CrvC_ReportData d = start;
-        CrvC_SynthesisReport::readMacroStatistics(synthesisReport, d);
-        return d;
-    });
-    auto usage = startReader([start, usageXml] {
-        CrvC_ReportData d = start;
-        CrvC_UsageXml::readUsageXml(usageXml, d);
-        return d;
-    });
-    auto commands = startReader([start, commandLog, fuseLog] {
-        CrvC_ReportData d = start;
-        CrvC_CommandLog::readCommandLog(commandLog, d);
-        CrvC_CommandLog::checkFuseLog(fuseLog, d);
-        return d;
-    });
-    auto help = startReader([] { return CrvC_HelpViewerData().sectionText(); });
-    auto cores = startReader([coresReport] { return CrvC_CoresStatistics().sectionText(coresReport); });
-    auto par = startReader([parPage] { return CrvC_RunStatistics::parUsageSection(parPage); });
-    auto osim = startReader([osimPage] { return CrvC_RunStatistics::osimUsageSection(osimPage); });
 
     const QString fileName = QString::fromLatin1(ReportFileName);
     page(QStringLiteral("<HTML><HEAD><TITLE>Device Usage Statistics Report</TITLE></HEAD>"));
@@ -275,41 +368,39 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
     page(heading);
 
     // The host, the repository and the settings are asked on this thread,
-    // while the readers work.
-    {
-        const CrvC_ReportData target = targetInfo.get();
-        m_data.targetDevice = target.targetDevice;
-        m_data.targetPackage = target.targetPackage;
-        m_data.targetSpeed = target.targetSpeed;
-    }
+    // while the readers work; then it reads along with them.
+    CrvC_SynthesisReport::readTargetInfo(mapReport, m_data);
     page(CrvC_VersionSection::versionSection(m_data, m_env));
     const QString runStatistics = CrvC_RunStatistics::runStatisticsSection(m_data.projectFileToOpen());
     const QString projectStatistics = CrvC_ProjectStatistics::projectStatisticsSection(
         m_data.projectFileToOpen(), m_env.now().date());
+    readers.finish();
 
-    m_data.macroStatistics = macros.get().macroStatistics;
-    {
-        CrvC_ReportData read = usage.get();
-        m_data.usageXmlPath = read.usageXmlPath;
-        m_data.designStatistics.swap(read.designStatistics);
-        m_data.deviceUsage.swap(read.deviceUsage);
-        m_data.reportConfigData.swap(read.reportConfigData);
-        m_data.reportPinData.swap(read.reportPinData);
-        m_data.reportConfigDataCount = read.reportConfigDataCount;
-        m_data.reportPinDataCount = read.reportPinDataCount;
-    }
-    m_data.commandHistory = commands.get().commandHistory;
-
+    m_data.macroStatistics.swap(macros.macroStatistics);
+    m_data.usageXmlPath = usage.usageXmlPath;
+    m_data.designStatistics.swap(usage.designStatistics);
+    m_data.deviceUsage.swap(usage.deviceUsage);
+    m_data.reportConfigData.swap(usage.reportConfigData);
+    m_data.reportPinData.swap(usage.reportPinData);
+    m_data.reportConfigDataCount = usage.reportConfigDataCount;
+    m_data.reportPinDataCount = usage.reportPinDataCount;
     CrvC_Lines tables([&page](const QString &line) { page(line); });
     CrvC_UsageXml::appendTables(m_data, tables);
+    // Written: the tables need not stay in memory.
+    m_data.macroStatistics.clear();
+    m_data.designStatistics.clear();
+    m_data.deviceUsage.clear();
+    m_data.reportConfigData.clear();
+    m_data.reportPinData.clear();
 
-    if (!m_data.commandHistory.isEmpty())
-        page(CrvC_CommandLog::commandLineHistorySection(m_data));
+    if (!history.isEmpty())
+        page.utf8(history);
+    history.clear();
     page(runStatistics);
-    page(help.get());
+    page.utf8(help);
     page(projectStatistics);
-    page(cores.get());
-    page(par.get());
-    page(osim.get());
+    page.utf8(cores);
+    page.utf8(par);
+    page.utf8(osim);
     page(QStringLiteral("</BODY></HTML>"));
 }

@@ -80,6 +80,9 @@ public:
     // The send iteration of this report (cached after the first call).
     QString projectIteration();
 
+    // The fields of the last build. What only fills the page's tables (the
+    // usage XML's tables, the macro statistics, the command history) is let
+    // go once written; the target, identifiers and paths stay.
     CrvC_ReportData &data() { return m_data; }
     const CrvC_ReportData &data() const { return m_data; }
     const Environment &environment() const { return m_env; }

@@ -25,6 +25,8 @@
 #include <QStandardPaths>
 #include <QTemporaryDir>
 
+#include <sys/resource.h>
+
 #include <cstdio>
 #include <functional>
 
@@ -218,6 +220,15 @@ long peakRssKiB()
     return 0;
 }
 
+// Processor time of this process so far (all threads, user and system), in ms.
+qint64 cpuMs()
+{
+    rusage usage{};
+    getrusage(RUSAGE_SELF, &usage);
+    return qint64(usage.ru_utime.tv_sec + usage.ru_stime.tv_sec) * 1000
+        + (usage.ru_utime.tv_usec + usage.ru_stime.tv_usec) / 1000;
+}
+
 // Milliseconds that `xmllint --noout file` takes; -1 when it cannot run.
 qint64 xmllintMs(const QString &xmllint, const QString &file)
 {
@@ -259,8 +270,9 @@ int main(int argc, char **argv)
     QTemporaryDir temp;
     const QString root = keep.isEmpty() ? temp.path() : QFileInfo(keep).absoluteFilePath();
     const QString xmllint = QStandardPaths::findExecutable(QStringLiteral("xmllint"));
-    std::printf("%-6s %10s %12s %8s %8s %10s %10s %12s %10s\n", "step", "cmd lines",
-                "usage items", "cores", "help", "input MB", "build ms", "xmllint ms", "peak MB");
+    std::printf("%-5s %10s %12s %7s %7s %9s %9s %8s %11s %8s\n", "step", "cmd lines",
+                "usage items", "cores", "help", "input MB", "build ms", "cpu ms", "xmllint ms",
+                "peak MB");
     for (int step = 1; step <= steps; ++step) {
         const Sizes sizes = sizesFor(scale * step / steps);
         const QString dir = root + QLatin1String("/step") + QString::number(step);
@@ -273,19 +285,21 @@ int main(int argc, char **argv)
         qputenv("APPDATA", QFile::encodeName(dir + QLatin1String("/appdata")));
         QDir::setCurrent(dir);
 
+        const qint64 cpuBefore = cpuMs();
         QElapsedTimer timer;
         timer.start();
         CrvC_ReportBuilder builder;
         builder.createReport(QString(), QStringLiteral("bench"), QStringLiteral("Xc6"));
         const qint64 ms = timer.elapsed();
+        const qint64 cpu = cpuMs() - cpuBefore;
         if (!builder.written()) {
             std::fprintf(stderr, "corvid-bench: the page was not written\n");
             return 1;
         }
         const qint64 floorMs = xmllintMs(xmllint, dir + QLatin1String("/bench_usage.xml"));
-        std::printf("%-6d %10d %12d %8d %8d %10.1f %10lld %12s %10.1f\n", step,
+        std::printf("%-5d %10d %12d %7d %7d %9.1f %9lld %8lld %11s %8.1f\n", step,
                     sizes.commandLines, sizes.usageItems, sizes.coreInstances, sizes.helpEntries,
-                    bytes / 1048576.0, static_cast<long long>(ms),
+                    bytes / 1048576.0, static_cast<long long>(ms), static_cast<long long>(cpu),
                     floorMs < 0 ? "-" : qPrintable(QString::number(floorMs)),
                     peakRssKiB() / 1024.0);
         std::fflush(stdout);
