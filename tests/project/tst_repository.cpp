@@ -248,14 +248,17 @@ void TestRepository::valuesSurviveTheProcess()
     QCOMPARE(runTool({QStringLiteral("get"), project, QStringLiteral("Corvid-DataCollection-Project-ID")}),
              QByteArray("0123456789abcdef0123456789abcdef"));
 
-    // A project created by orb carries its creation time: made today.
+    // A project created by orb carries its creation time: made today (or
+    // yesterday, when midnight passed meanwhile).
     const QString created = m_env->home() + QLatin1String("/created/led.orb");
     QDir().mkpath(QFileInfo(created).absolutePath());
+    const QDate day = QDate::currentDate();
     QCOMPARE(CorvidTest::runStaged(QStringLiteral("orb"), {QStringLiteral("new-project"), created},
                                    m_env->home())
                  .exitCode,
              0);
-    QCOMPARE(runTool({QStringLiteral("age"), created}), QByteArray("0"));
+    const QByteArray age = runTool({QStringLiteral("age"), created});
+    QVERIFY2(age == "0" || (age == "1" && QDate::currentDate() != day), age.constData());
 }
 
 void TestRepository::concurrentWritersLoseNothing()
