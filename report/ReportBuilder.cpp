@@ -85,11 +85,13 @@ void releaseFreedMemory()
 #endif
 }
 
-// Runs the pure file readers side by side: the calling thread and one worker
-// thread per further processor core (two at most) take the readers in turn,
-// in the order given (largest first). Few threads rather than one per
-// reader: each thread allocates from a heap of its own that keeps what it
-// freed, so every extra thread adds to the peak memory of a build.
+// Runs the pure file readers side by side. The calling thread reads the
+// first reader (the largest), then helps the workers with the rest: one
+// worker per further processor core, two at most. Few threads rather than
+// one per reader: each thread allocates from a heap of its own that keeps
+// what it freed, so every extra thread adds to the peak memory of a build,
+// and the largest results are best kept in the calling thread's heap, which
+// the next build reuses.
 class ReaderPool
 {
 public:
@@ -97,8 +99,6 @@ public:
         : m_readers(std::move(readers))
         , m_failures(m_readers.size())
     {
-        // The usage XML takes most of the time, the rest fits beside it: more
-        // than two workers would only add heaps.
         const int workers = qBound(1, QThread::idealThreadCount() - 1, 2);
         for (int i = 0; i < workers; ++i) {
             try {
@@ -115,6 +115,8 @@ public:
     // the first failure of a reader, in reader order.
     void finish()
     {
+        if (!m_readers.empty())
+            run(0);
         work();
         join();
         for (const std::exception_ptr &failure : m_failures) {
@@ -127,13 +129,18 @@ private:
     void work()
     {
         for (std::size_t i = m_next++; i < m_readers.size(); i = m_next++) {
-            try {
-                m_readers[i]();
-            } catch (...) {
-                m_failures[i] = std::current_exception();
-            }
+            run(i);
             // What a reader needed only on the way may serve the others.
             releaseFreedMemory();
+        }
+    }
+
+    void run(std::size_t i)
+    {
+        try {
+            m_readers[i]();
+        } catch (...) {
+            m_failures[i] = std::current_exception();
         }
     }
 
@@ -147,7 +154,7 @@ private:
 
     std::vector<std::function<void()>> m_readers;
     std::vector<std::exception_ptr> m_failures;
-    std::atomic<std::size_t> m_next{0};
+    std::atomic<std::size_t> m_next{1}; // the first is the calling thread's
     std::vector<std::thread> m_threads;
 };
 

@@ -14,9 +14,10 @@
 // design name, the busy cursor) goes through the environment hooks, which
 // the review dialog supplies.
 //
-// The file readers run side by side on worker threads, each on a builder
-// data of its own; whatever needs the host's project manager, the repository
-// or the settings stays on the calling thread. The page goes to the file
+// The file readers run side by side, on the calling thread and a worker
+// thread or two, each on builder data of its own; whatever needs the host's
+// project manager, the repository or the settings stays on the calling
+// thread. The page goes to the file
 // line by line as it is assembled, so a large project never has the whole
 // page in memory: the builder keeps only its beginning, for the review.
 class CrvC_ReportBuilder
