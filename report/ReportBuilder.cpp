@@ -349,16 +349,20 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
     const CrvC_ReportData start = m_data;
     CrvC_ReportData usage = start, macros = start, commands = start;
     QByteArray history, help, cores, par, osim;
+    // Largest first: the usage XML for the calling thread, then what needs
+    // most memory on the way, while the usage tables are still small.
     ReaderPool readers({
         [&] { CrvC_UsageXml::readUsageXml(usageXml, usage); },
-        [&] { cores = CrvC_CoresStatistics().sectionText(coresReport).toUtf8(); },
         [&] {
             CrvC_CommandLog::readCommandLog(commandLog, commands);
             CrvC_CommandLog::checkFuseLog(fuseLog, commands);
-            if (!commands.commandHistory.isEmpty())
-                history = CrvC_CommandLog::commandLineHistorySection(commands).toUtf8();
+            if (commands.commandHistory.isEmpty())
+                return;
+            const QString text = CrvC_CommandLog::commandLineHistorySection(commands);
             commands.commandHistory.clear();
+            history = text.toUtf8();
         },
+        [&] { cores = CrvC_CoresStatistics().sectionText(coresReport).toUtf8(); },
         [&] { help = CrvC_HelpViewerData().sectionText().toUtf8(); },
         [&] { CrvC_SynthesisReport::readMacroStatistics(synthesisReport, macros); },
         [&] { par = CrvC_RunStatistics::parUsageSection(parPage).toUtf8(); },
