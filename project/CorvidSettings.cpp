@@ -1,6 +1,7 @@
 #include "CorvidSettings.h"
 
 #include "host/Identifier.h"
+#include "host/InputFile.h"
 #include "host/Settings.h"
 #include "host/VantorPath.h"
 
@@ -42,8 +43,9 @@ void CrvC_Settings::readInstallSettings(QString &timestamp, bool &collect)
     }
     if (path.isEmpty())
         return;
-    QFile file(path);
-    if (!file.open(QIODevice::ReadOnly | QIODevice::Text))
+    QFile file;
+    if (Port::InputFile::open(path, Port::InputFile::InstallSettings, file)
+        != Port::InputFile::Status::Opened)
         return;
     QTextStream in(&file);
     in.setEncoding(QStringConverter::Utf8);

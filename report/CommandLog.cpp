@@ -1,5 +1,7 @@
 #include "CommandLog.h"
 
+#include "host/InputFile.h"
+
 #include <QFile>
 #include <QFileInfo>
 #include <QStringMatcher>
@@ -123,14 +125,12 @@ QString CrvC_CommandLog::anonymized(const QString &line, const QString &design)
 
 bool CrvC_CommandLog::readCommandLog(const QString &path, CrvC_ReportData &data)
 {
-    const QFileInfo info(path);
-    if (!info.isFile())
-        return false;
-    QFile file(path);
-    if (!file.open(QIODevice::ReadOnly))
+    QFile file;
+    if (Port::InputFile::open(path, Port::InputFile::CommandLog, file)
+        != Port::InputFile::Status::Opened)
         return false;
 
-    const Anonymizer anonymize(info.baseName());
+    const Anonymizer anonymize(QFileInfo(path).baseName());
     QTextStream in(&file);
     QString line;
     while (in.readLineInto(&line))
@@ -140,7 +140,7 @@ bool CrvC_CommandLog::readCommandLog(const QString &path, CrvC_ReportData &data)
 
 bool CrvC_CommandLog::checkFuseLog(const QString &path, CrvC_ReportData &data)
 {
-    if (!QFileInfo(path).isFile())
+    if (!Port::InputFile::isAvailable(path, Port::InputFile::FuseLog))
         return false;
     data.commandHistory.append(QStringLiteral("fuse"));
     return true;

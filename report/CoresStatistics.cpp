@@ -91,7 +91,8 @@ void CrvC_CoresStatistics::parse()
     m_coreInstances.clear();
     m_currentInstance = -1;
     // A refused document counts as unreadable, whatever was collected.
-    if (CrvC_XmlDepthGuard::parseFile(m_fileName, *this) == CrvC_XmlDepthGuard::Outcome::Refused)
+    if (CrvC_XmlDepthGuard::parseFile(m_fileName, Port::InputFile::CoreReport, *this)
+        == CrvC_XmlDepthGuard::Outcome::Refused)
         m_coreInstances.clear();
 }
 

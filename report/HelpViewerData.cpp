@@ -33,7 +33,7 @@ void appendGroup(QString &text, const QList<CrvC_HelpViewerData::Entry> &entries
 
 CrvC_HelpViewerData::CrvC_HelpViewerData()
 {
-    if (CrvC_XmlDepthGuard::parseFile(helpFilePath(), *this)
+    if (CrvC_XmlDepthGuard::parseFile(helpFilePath(), Port::InputFile::HelpViewerData, *this)
         == CrvC_XmlDepthGuard::Outcome::Refused) {
         m_searchFoundList.clear();
         m_searchNotFoundList.clear();

@@ -35,9 +35,9 @@
 
 const char *const CrvC_ReportBuilder::ReportFileName = "device_usage_statistics.html";
 
-// About 4 MB of text: far more than a reader scrolls through, and a text
-// view stays responsive with it.
-const qsizetype CrvC_ReportBuilder::PageTextLimit = 2 * 1024 * 1024;
+// A little more than the review dialog shows of a large page (250,000
+// characters, cut there at a line end), so that it still sees the cut.
+const qsizetype CrvC_ReportBuilder::PageTextLimit = 256 * 1024;
 
 namespace {
 

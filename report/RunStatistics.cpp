@@ -2,11 +2,11 @@
 
 #include "host/AutoRelease.h"
 #include "host/Factory.h"
+#include "host/InputFile.h"
 #include "host/QualityData.h"
 #include "host/String.h"
 
 #include <QFile>
-#include <QFileInfo>
 #include <QTextStream>
 
 namespace {
@@ -14,10 +14,9 @@ namespace {
 QString subReport(const QString &path, QLatin1String lineEnd)
 {
     QString text = QStringLiteral("&nbsp;<BR>");
-    if (!QFileInfo(path).isFile())
-        return text;
-    QFile file(path);
-    if (!file.open(QIODevice::ReadOnly))
+    QFile file;
+    if (Port::InputFile::open(path, Port::InputFile::SubReport, file)
+        != Port::InputFile::Status::Opened)
         return text;
     QTextStream in(&file);
     QString line;

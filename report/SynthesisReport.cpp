@@ -1,5 +1,7 @@
 #include "SynthesisReport.h"
 
+#include "host/InputFile.h"
+
 #include <QFile>
 #include <QTextStream>
 
@@ -21,8 +23,9 @@ QString secondField(const QString &line)
 
 bool CrvC_SynthesisReport::readTargetInfo(const QString &path, CrvC_ReportData &data)
 {
-    QFile file(path);
-    if (!file.open(QIODevice::ReadOnly))
+    QFile file;
+    if (Port::InputFile::open(path, Port::InputFile::MapReport, file)
+        != Port::InputFile::Status::Opened)
         return true;
     QTextStream in(&file);
     in.setEncoding(QStringConverter::Utf8);
@@ -40,8 +43,9 @@ bool CrvC_SynthesisReport::readTargetInfo(const QString &path, CrvC_ReportData &
 
 bool CrvC_SynthesisReport::readMacroStatistics(const QString &path, CrvC_ReportData &data)
 {
-    QFile file(path);
-    if (!file.open(QIODevice::ReadOnly))
+    QFile file;
+    if (Port::InputFile::open(path, Port::InputFile::SynthesisReport, file)
+        != Port::InputFile::Status::Opened)
         return true;
     QTextStream in(&file);
     in.setEncoding(QStringConverter::Utf8);

@@ -1,6 +1,7 @@
 #include "UsageXml.h"
 #include "SynthesisReport.h"
-#include "XmlDepthGuard.h"
+
+#include "host/XmlGuard.h"
 
 #include <QFile>
 #include <QXmlStreamReader>
@@ -273,8 +274,9 @@ void appendSpreadTable(const char *title, const QMap<QString, QStringList> &tabl
 bool CrvC_UsageXml::readUsageXml(const QString &path, CrvC_ReportData &data)
 {
     data.usageXmlPath = path;
-    QFile file(path);
-    if (!file.open(QIODevice::ReadOnly) || file.size() > CrvC_XmlDepthGuard::MaxFileSize)
+    QFile file;
+    if (Port::XmlGuard::open(path, Port::InputFile::UsageXml, file)
+        != Port::XmlGuard::Outcome::Accepted)
         return false;
 
     // Filled on the side: a document that turns out to be malformed, or
@@ -285,14 +287,11 @@ bool CrvC_UsageXml::readUsageXml(const QString &path, CrvC_ReportData &data)
     reader.setNamespaceProcessing(false);
     int depth = 0;
     while (!reader.atEnd()) {
-        switch (reader.readNext()) {
+        switch (Port::XmlGuard::readNext(reader, depth)) {
         case QXmlStreamReader::StartElement:
-            if (++depth > CrvC_XmlDepthGuard::MaxDepth)
-                return false;
             walker.startElement(reader.qualifiedName(), reader.attributes());
             break;
         case QXmlStreamReader::EndElement:
-            --depth;
             walker.endElement();
             break;
         default:

@@ -9,8 +9,9 @@ class CrvC_UsageXml
 {
 public:
     // Fills the four section tables and the item counters; false when the file
-    // is missing, unreadable or malformed, or larger or nested deeper than
-    // CrvC_XmlDepthGuard allows (the tables are then left as they were).
+    // is missing, unreadable or malformed, or refused by Port::XmlGuard (not
+    // a regular file, too large, an internal DTD subset, nested too deeply);
+    // the tables are then left as they were.
     // Reads the file as a stream, in one pass. Groups inside groups are
     // stored under their own names, each with its own items.
     static bool readUsageXml(const QString &path, CrvC_ReportData &data);

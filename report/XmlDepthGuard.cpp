@@ -4,37 +4,7 @@
 #include <QtCore5Compat/QXmlInputSource>
 #include <QtCore5Compat/QXmlSimpleReader>
 
-#include <QFile>
-#include <QFileInfo>
-#include <QXmlStreamReader>
-
 namespace {
-
-enum class Scan { Acceptable, TooDeep, Malformed };
-
-Scan scan(const QByteArray &xml, int maxDepth)
-{
-    QXmlStreamReader reader(xml);
-    // Prefixes are left alone so that an undeclared one does not end the
-    // scan early; neither the DOM (as the readers use it) nor the SAX reader
-    // minds them.
-    reader.setNamespaceProcessing(false);
-    int depth = 0;
-    while (!reader.atEnd()) {
-        switch (reader.readNext()) {
-        case QXmlStreamReader::StartElement:
-            if (++depth > maxDepth)
-                return Scan::TooDeep;
-            break;
-        case QXmlStreamReader::EndElement:
-            --depth;
-            break;
-        default:
-            break;
-        }
-    }
-    return reader.hasError() ? Scan::Malformed : Scan::Acceptable;
-}
 
 // Passes every event on to the real handler, but stops the parse when an
 // element opens deeper than allowed. The SAX reader reports a start tag
@@ -100,30 +70,20 @@ private:
 
 } // namespace
 
-bool CrvC_XmlDepthGuard::isAcceptable(const QByteArray &xml, int maxDepth)
-{
-    return scan(xml, maxDepth) == Scan::Acceptable;
-}
-
-bool CrvC_XmlDepthGuard::exceedsDepth(const QByteArray &xml, int maxDepth)
-{
-    return scan(xml, maxDepth) == Scan::TooDeep;
-}
-
 CrvC_XmlDepthGuard::Outcome CrvC_XmlDepthGuard::parseFile(const QString &path,
+                                                          Port::InputFile::Kind kind,
                                                           QXmlContentHandler &handler,
                                                           int maxDepth)
 {
-    // Only regular files: a device or a pipe has no size to check first.
-    QFile file(path);
-    if (!QFileInfo(file).isFile() || !file.open(QIODevice::ReadOnly))
+    QByteArray xml;
+    switch (Port::XmlGuard::read(path, kind, xml, maxDepth)) {
+    case Port::XmlGuard::Outcome::NotRead:
         return Outcome::NotRead;
-    if (file.size() > MaxFileSize)
+    case Port::XmlGuard::Outcome::Refused:
         return Outcome::Refused;
-    const QByteArray xml = file.readAll();
-    file.close();
-    if (exceedsDepth(xml, maxDepth))
-        return Outcome::Refused;
+    case Port::XmlGuard::Outcome::Accepted:
+        break;
+    }
 
     QXmlInputSource source;
     source.setData(xml);

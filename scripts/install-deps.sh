@@ -5,7 +5,9 @@ set -e
 
 PACKAGES="cmake g++ make pkg-config
 qt6-base-dev qt6-5compat-dev libqt6sql6-sqlite libgl-dev
-libsqlite3-dev"
+libsqlite3-dev
+libcurl4-openssl-dev libcpp-httplib-dev libssl-dev openssl
+libpacparser-dev"
 
 missing=""
 for p in $PACKAGES; do

@@ -1,11 +1,299 @@
 #include "SendUsingSSL.h"
 
-CrvC_SendUsingSSL::CrvC_SendUsingSSL() = default;
+#include "transmit/MakerServer.h"
+#include "transmit/ProxyDiscovery.h"
+#include "transmit/UserNotice.h"
+
+#include "host/Env.h"
+#include "host/MsgManData.h"
+#include "host/Version.h"
+
+#include <QBuffer>
+#include <QCoreApplication>
+#include <QEventLoopLocker>
+#include <QTimer>
+#include <QUrl>
+
+#include <netdb.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+const char *const CrvC_SendUsingSSL::ProgramName = "vancurl";
+const char *const CrvC_SendUsingSSL::AccessCode = "v9orn";
+const char *const CrvC_SendUsingSSL::RedirectPath =
+    "/cgi-bin/SW_Docs_Redirect/sw_docs_redirect?topic=corvidupload";
+const char *const CrvC_SendUsingSSL::CaBundle = "reports/ca-cert-bundle.crt";
+const char *const CrvC_SendUsingSSL::FailureText = QT_TRANSLATE_NOOP(
+    "CrvC_SendUsingSSL",
+    "Failed to send data through SSL. Please make sure your proxy settings are correct under "
+    "Edit->Preferences->VantorUpdate. If your proxy settings are correct, but you still see this "
+    "error, please select an e-mail method to send data instead.");
+
+namespace {
+
+QString caBundlePath()
+{
+    return QString::fromUtf8(Port_Env::GetDataFileName(CrvC_SendUsingSSL::CaBundle).c_str());
+}
+
+QStringList connectionArguments(const QString &proxy)
+{
+    QStringList arguments;
+    if (!proxy.isEmpty())
+        arguments << QStringLiteral("--proxy") << proxy;
+    arguments << QStringLiteral("--cacert") << caBundlePath();
+    return arguments;
+}
+
+// One line for the debug output: line ends folded, long answers cut.
+QByteArray forDebug(const QByteArray &text)
+{
+    QByteArray line = text.trimmed().left(500);
+    line.replace('\r', ' ').replace('\n', ' ');
+    return line;
+}
+
+// A redirect page is a few hundred bytes; a lookup that answers more than
+// this is stopped rather than buffered in the host's memory.
+const qint64 MaxLookupAnswer = 1024 * 1024;
+// Of the upload's answer only the start is kept, for the debug output.
+const int MaxUploadAnswer = 4096;
+
+std::shared_ptr<QEventLoopLocker> keepApplicationAlive()
+{
+    if (!QCoreApplication::instance())
+        return nullptr;
+    return std::make_shared<QEventLoopLocker>();
+}
+
+} // namespace
+
+CrvC_SendUsingSSL::CrvC_SendUsingSSL()
+    : CrvC_SendUsingSSL(CrvC_ProxyDiscovery::findProxy())
+{
+}
+
+CrvC_SendUsingSSL::CrvC_SendUsingSSL(const QString &proxy)
+    : QObject(nullptr)
+    , m_proxy(proxy)
+{
+}
+
+CrvC_SendUsingSSL::~CrvC_SendUsingSSL() = default;
+
+QString CrvC_SendUsingSSL::redirectUrl()
+{
+    // Whatever scheme the server setting names, the lookup is made over
+    // https: whoever answers it chooses where the report goes.
+    QUrl url(CrvC_MakerServer::baseUrl());
+    url.setScheme(QStringLiteral("https"));
+    return url.toString(QUrl::RemovePath | QUrl::RemoveQuery | QUrl::RemoveFragment)
+           + QLatin1String(RedirectPath);
+}
+
+QStringList CrvC_SendUsingSSL::redirectArguments() const
+{
+    return connectionArguments(m_proxy) << redirectUrl();
+}
+
+QStringList CrvC_SendUsingSSL::uploadArguments(const QString &url) const
+{
+    return connectionArguments(m_proxy)
+           << QStringLiteral("-F") << QLatin1String("file_loc=@") + m_reportFile
+           << QStringLiteral("-F") << QLatin1String("domain=") + domainName()
+           << QStringLiteral("-F") << QLatin1String("regid=") + registrationId()
+           << QStringLiteral("-F") << QLatin1String("access=") + QLatin1String(AccessCode) << url;
+}
 
 void CrvC_SendUsingSSL::SendFile(const QString &file)
 {
-    Q_UNUSED(file);
+    if (m_lookupProcess) {
+        Port_MsgManData::debugStub("Corvid ERROR: a send is already under way for %s\n",
+                                   qUtf8Printable(m_reportFile));
+        return;
+    }
+    m_reportFile = file;
+    m_keepAlive = keepApplicationAlive();
+    const QStringList arguments = redirectArguments();
+    for (const QString &argument : arguments)
+        Port_MsgManData::debugStub("Redirect Args: %s\n", qUtf8Printable(argument));
+
+    m_lookupProcess = new QProcess(this);
+    connect(m_lookupProcess, &QProcess::finished, this, &CrvC_SendUsingSSL::LaunchSSLProcess);
+    connect(m_lookupProcess, &QProcess::errorOccurred, this, [this](QProcess::ProcessError error) {
+        // A tool that cannot be started sends no finished signal. Report it
+        // once control is back in the event loop, as for a failed lookup.
+        if (error == QProcess::FailedToStart)
+            QTimer::singleShot(0, this, &CrvC_SendUsingSSL::lookupFailedToStart);
+    });
+    connect(m_lookupProcess, &QProcess::readyReadStandardOutput, this, [this] {
+        if (m_lookupProcess->bytesAvailable() > MaxLookupAnswer && m_lookupProcess->state() == QProcess::Running) {
+            Port_MsgManData::debugStub("Corvid ERROR: the address lookup answered more than %lld bytes.\n",
+                                       static_cast<long long>(MaxLookupAnswer));
+            m_lookupProcess->kill(); // finished follows, as a failed lookup
+        }
+    });
+    m_lookupProcess->start(QLatin1String(ProgramName), arguments, QIODevice::ReadWrite);
+}
+
+void CrvC_SendUsingSSL::lookupFailedToStart()
+{
+    if (m_ended)
+        return;
+    m_ended = true;
+    Port_MsgManData::debugStub("Corvid ERROR: cannot start %s: %s\n", ProgramName,
+                               qUtf8Printable(m_lookupProcess->errorString()));
+    Port_MsgManData::debugStub("Corvid ERROR: Redirected URL is empty.\n");
+    reportFailure(m_reportFile);
+    m_lookupProcess->deleteLater();
     deleteLater();
 }
 
-void CrvC_SendUsingSSL::LaunchSSLProcess() {}
+void CrvC_SendUsingSSL::LaunchSSLProcess()
+{
+    if (m_ended || !m_lookupProcess)
+        return;
+    m_ended = true;
+    QString address;
+    if (m_lookupProcess->exitStatus() == QProcess::NormalExit && m_lookupProcess->exitCode() == 0) {
+        m_lookupProcess->setReadChannel(QProcess::StandardOutput);
+        address = uploadAddress(m_lookupProcess);
+    } else {
+        // An error page or a half-read answer names no address to trust.
+        Port_MsgManData::debugStub("Corvid ERROR: the address lookup failed (exit status %d): %s\n",
+                                   m_lookupProcess->exitStatus() == QProcess::NormalExit
+                                       ? m_lookupProcess->exitCode()
+                                       : -1,
+                                   forDebug(m_lookupProcess->readAllStandardError()).constData());
+    }
+
+    if (address.isEmpty()) {
+        Port_MsgManData::debugStub("Corvid ERROR: Redirected URL is empty.\n");
+        reportFailure(m_reportFile);
+    } else {
+        Port_MsgManData::debugStub("Corvid: SSL process to %s has started.\n", qUtf8Printable(address));
+        startUpload(address);
+    }
+    m_lookupProcess->deleteLater();
+    deleteLater();
+}
+
+void CrvC_SendUsingSSL::startUpload(const QString &address)
+{
+    // The upload outlives this object: it owns itself and is released when it
+    // ends, holding the application open until then.
+    auto *upload = new QProcess;
+    const QString reportFile = m_reportFile;
+    std::shared_ptr<QEventLoopLocker> keepAlive = m_keepAlive;
+    auto answerStart = std::make_shared<QByteArray>();
+    auto keepAnswerStart = [upload, answerStart] {
+        const QByteArray chunk = upload->readAllStandardOutput();
+        if (answerStart->size() < MaxUploadAnswer)
+            answerStart->append(chunk.left(MaxUploadAnswer - answerStart->size()));
+    };
+    connect(upload, &QProcess::readyReadStandardOutput, upload, keepAnswerStart);
+    connect(upload, &QProcess::finished, upload,
+            [upload, reportFile, keepAlive, answerStart, keepAnswerStart](int exitCode,
+                                                                          QProcess::ExitStatus exitStatus) {
+                keepAnswerStart();
+                const QByteArray answer = forDebug(*answerStart);
+                const QByteArray errors = forDebug(upload->readAllStandardError());
+                const int status = exitStatus == QProcess::NormalExit ? exitCode : -1;
+                Port_MsgManData::debugStub("Corvid: SSL upload ended with exit status %d: %s\n", status,
+                                           answer.constData());
+                if (status != 0) {
+                    Port_MsgManData::debugStub("Corvid ERROR: SSL upload failed: %s\n", errors.constData());
+                    reportFailure(reportFile);
+                }
+                upload->deleteLater();
+            });
+    connect(upload, &QProcess::errorOccurred, upload, [upload, reportFile, keepAlive](QProcess::ProcessError error) {
+        if (error != QProcess::FailedToStart)
+            return; // the finished signal follows
+        Port_MsgManData::debugStub("Corvid ERROR: cannot start %s: %s\n", ProgramName,
+                                   qUtf8Printable(upload->errorString()));
+        upload->deleteLater();
+        QTimer::singleShot(0, [reportFile, keepAlive] { reportFailure(reportFile); });
+    });
+    upload->start(QLatin1String(ProgramName), uploadArguments(address), QIODevice::ReadWrite);
+}
+
+void CrvC_SendUsingSSL::reportFailure(const QString &reportFile)
+{
+    CrvC_UserNotice::warning(tr(FailureText));
+    CrvC_UserNotice::offerEmail(reportFile);
+}
+
+QString CrvC_SendUsingSSL::uploadAddress(QIODevice *output)
+{
+    static const QLatin1String marker("URL=http");
+    for (QByteArray bytes = output->readLine(); !bytes.isEmpty(); bytes = output->readLine()) {
+        const QString line = QString::fromUtf8(bytes);
+        const qsizetype p = line.indexOf(marker);
+        if (p < 0)
+            continue;
+        const qsizetype q = line.indexOf(QLatin1Char('"'), p + 3);
+        QString address = q < 0 ? line.mid(p + 4) : line.mid(p + 4, q - (p + 4));
+        while (address.endsWith(QLatin1Char('\n')) || address.endsWith(QLatin1Char('\r')))
+            address.chop(1);
+        const QUrl url(address, QUrl::StrictMode);
+        if (!url.isValid() || url.scheme() != QLatin1String("https") || url.host().isEmpty()) {
+            Port_MsgManData::debugStub("Corvid ERROR: not an https upload address: %s\n",
+                                       qUtf8Printable(address));
+            return QString();
+        }
+        return address;
+    }
+    return QString();
+}
+
+QString CrvC_SendUsingSSL::uploadAddress(const QByteArray &output)
+{
+    QBuffer buffer;
+    buffer.setData(output);
+    buffer.open(QIODevice::ReadOnly);
+    return uploadAddress(&buffer);
+}
+
+QString CrvC_SendUsingSSL::domainName()
+{
+    char name[4096] = {0};
+    if (::gethostname(name, sizeof name - 1) != 0 || !name[0])
+        return QString();
+    QString fqdn = QString::fromLocal8Bit(name);
+    if (!fqdn.contains(QLatin1Char('.'))) {
+        // The canonical name of the machine's own name, as the resolver
+        // configuration gives it (normally /etc/hosts).
+        addrinfo hints = {};
+        hints.ai_flags = AI_CANONNAME;
+        hints.ai_family = AF_UNSPEC;
+        hints.ai_socktype = SOCK_STREAM;
+        addrinfo *result = nullptr;
+        if (::getaddrinfo(name, nullptr, &hints, &result) == 0 && result) {
+            if (result->ai_canonname && result->ai_canonname[0])
+                fqdn = QString::fromLocal8Bit(result->ai_canonname);
+            ::freeaddrinfo(result);
+        }
+    }
+    if (fqdn.endsWith(QLatin1Char('.')))
+        fqdn.chop(1);
+    return lastTwoLabels(fqdn);
+}
+
+QString CrvC_SendUsingSSL::lastTwoLabels(const QString &name)
+{
+    int dots = 0;
+    for (qsizetype i = name.size() - 1; i >= 0; --i) {
+        if (name.at(i) == QLatin1Char('.') && ++dots == 2)
+            return name.mid(i + 1);
+    }
+    return name;
+}
+
+QString CrvC_SendUsingSSL::registrationId()
+{
+    const Port::StringBase text = Port::UserInformation::getRegistrationText();
+    if (!text.IsEmpty() && text.Compare(Port::UserInformation::NoInformationText, true) != 0)
+        return QString::fromUtf8(text.c_str());
+    return QString::fromUtf8(Port::Version::getValue("Registration_ID").c_str());
+}

@@ -1,5 +1,8 @@
 #include "ProjectDocument.h"
 
+#include "host/InputFile.h"
+#include "host/XmlGuard.h"
+
 #include <QFile>
 #include <QFileInfo>
 #include <QSaveFile>
@@ -60,22 +63,41 @@ private:
     QXmlStreamAttributes m_attributes;
 };
 
+// Unicode encodings and their subsets: all of their text is kept when the
+// file is saved again (as UTF-8).
+bool isWritableEncoding(const QString &name)
+{
+    static const char *const names[] = {"UTF-8",    "UTF8",     "UTF-16",   "UTF-16LE",
+                                        "UTF-16BE", "UTF-32",   "UTF-32LE", "UTF-32BE",
+                                        "US-ASCII", "ASCII",    "ISO-8859-1", "Latin1"};
+    for (const char *known : names) {
+        if (name.compare(QLatin1String(known), Qt::CaseInsensitive) == 0)
+            return true;
+    }
+    return false;
+}
+
 } // namespace
 
 bool ProjectDocument::read(const QString &path, QString *error)
 {
     const QFileInfo info(path);
-    if (!info.exists())
+    QFile file;
+    QString problem;
+    switch (Port::InputFile::open(path, Port::InputFile::ProjectFile, file, &problem)) {
+    case Port::InputFile::Status::Opened:
+        break;
+    case Port::InputFile::Status::Missing:
         return fail(error, QStringLiteral("%1: no such project file").arg(path));
-    if (!info.isFile())
-        return fail(error, QStringLiteral("%1: not a project file (not a regular file)").arg(path));
-    if (info.size() > MaximumFileSize)
-        return fail(error, QStringLiteral("%1: not a project file (%2 bytes is too large)")
-                               .arg(path)
-                               .arg(info.size()));
-    QFile file(path);
-    if (!file.open(QIODevice::ReadOnly))
-        return fail(error, QStringLiteral("%1: cannot be read: %2").arg(path, file.errorString()));
+    case Port::InputFile::Status::NotRegular:
+    case Port::InputFile::Status::TooLarge:
+        return fail(error, QStringLiteral("%1: not a project file (%2)").arg(path, problem));
+    case Port::InputFile::Status::Unreadable:
+        return fail(error, QStringLiteral("%1: cannot be read: %2").arg(path, problem));
+    }
+    if (Port::XmlGuard::checkProlog(file, path, Port::InputFile::ProjectFile, &problem)
+        != Port::XmlGuard::Outcome::Accepted)
+        return fail(error, QStringLiteral("%1: not a well-formed project file: %2").arg(path, problem));
 
     ProjectDocument document;
     QSet<QString> propertyNames;
@@ -89,6 +111,18 @@ bool ProjectDocument::read(const QString &path, QString *error)
     ProcessProperty *process = nullptr;
     while (!xml.atEnd() && !xml.hasError()) {
         const QXmlStreamReader::TokenType token = xml.readNext();
+        if (token == QXmlStreamReader::StartDocument) {
+            // The file is saved as UTF-8; an encoding whose text may not
+            // survive that (UTF-7 can decode to unpaired surrogates) would
+            // make a project that can be read but never saved again.
+            const QString encoding = xml.documentEncoding().toString();
+            if (!encoding.isEmpty() && !isWritableEncoding(encoding)) {
+                return fail(error, QStringLiteral("%1: not a project file: its encoding \"%2\" is "
+                                                  "not supported (save it as UTF-8)")
+                                       .arg(path, encoding));
+            }
+            continue;
+        }
         if (token == QXmlStreamReader::EndElement) {
             if (depth == 2)
                 group = Group::None;

@@ -58,9 +58,6 @@ public:
         QList<Condition> conditions;
     };
 
-    // Files larger than this are refused.
-    static const qint64 MaximumFileSize = 64 * 1024 * 1024;
-
     QString name; // design name; the file's base name when the file has none
     Target target;
     QList<DesignProperty> properties;
@@ -70,7 +67,10 @@ public:
 
     // Replaces the contents with those of `path`. False, with a message that
     // names the file and the problem, when the file is missing, unreadable or
-    // not a well-formed project file; the contents are then unchanged.
+    // not a well-formed project file (which includes an internal DTD subset
+    // and an encoding other than UTF-8, UTF-16, UTF-32, ASCII or Latin-1);
+    // the contents are then unchanged. The file is opened as Port::InputFile
+    // opens inputs (a regular file of at most 64 MiB).
     bool read(const QString &path, QString *error);
     // Writes the contents to `path` (replaced as a whole, or left alone on
     // failure).

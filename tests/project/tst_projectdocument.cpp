@@ -96,6 +96,12 @@ void TestProjectDocument::refusesBadFiles_data()
     QTest::newRow("missing file") << QByteArray("-") << "no such project file";
     QTest::newRow("empty file") << QByteArray() << "not a well-formed project file";
     QTest::newRow("unclosed element") << QByteArray("<project><sources>") << "line 1";
+    QTest::newRow("UTF-7")
+        << QByteArray("<?xml version='1.0' encoding='UTF-7'?><project name='+2D3d,-'/>")
+        << "its encoding \"UTF-7\" is not supported";
+    QTest::newRow("internal DTD subset")
+        << QByteArray("<!DOCTYPE project [<!ENTITY n 'x'>]><project name='&n;'/>")
+        << "not a well-formed project file: DTD declarations";
     QTest::newRow("other root") << QByteArray("<workspace/>") << "the root element is <workspace>";
     QTest::newRow("file without path")
         << QByteArray("<project><sources><file type='VHDL'/></sources></project>")

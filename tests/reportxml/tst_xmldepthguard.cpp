@@ -32,8 +32,6 @@ class tst_XmlDepthGuard : public QObject
 
 private Q_SLOTS:
     void initTestCase();
-    void isAcceptable_data();
-    void isAcceptable();
     void parseFile_data();
     void parseFile();
 
@@ -48,33 +46,6 @@ void tst_XmlDepthGuard::initTestCase()
     QVERIFY(m_dir.isValid());
 }
 
-void tst_XmlDepthGuard::isAcceptable_data()
-{
-    QTest::addColumn<QByteArray>("xml");
-    QTest::addColumn<int>("maxDepth");
-    QTest::addColumn<bool>("acceptable");
-
-    QTest::newRow("shallow document") << QByteArray("<r><a x='1'/><b>t</b></r>") << 1000 << true;
-    QTest::newRow("depth at the limit") << XmlSamples::deepDocument(5) << 5 << true;
-    QTest::newRow("one level past the limit") << XmlSamples::deepDocument(6) << 5 << false;
-    QTest::newRow("default limit, 1000 levels") << XmlSamples::deepDocument(1000) << 1000 << true;
-    QTest::newRow("50000 levels") << XmlSamples::deepDocument(50000) << 1000 << false;
-    QTest::newRow("tag mismatch") << QByteArray("<r><a></b></r>") << 1000 << false;
-    QTest::newRow("truncated") << QByteArray("<r><a>") << 1000 << false;
-    QTest::newRow("empty") << QByteArray() << 1000 << false;
-    QTest::newRow("binary") << XmlSamples::binaryBytes() << 1000 << false;
-    QTest::newRow("undeclared prefix, as the DOM reads it")
-        << QByteArray("<r><x:a/></r>") << 1000 << true;
-}
-
-void tst_XmlDepthGuard::isAcceptable()
-{
-    QFETCH(QByteArray, xml);
-    QFETCH(int, maxDepth);
-    QFETCH(bool, acceptable);
-    QCOMPARE(CrvC_XmlDepthGuard::isAcceptable(xml, maxDepth), acceptable);
-}
-
 void tst_XmlDepthGuard::parseFile_data()
 {
     QTest::addColumn<QByteArray>("xml"); // written to the file unless a null array
@@ -86,7 +57,13 @@ void tst_XmlDepthGuard::parseFile_data()
     using O = CrvC_XmlDepthGuard::Outcome;
     QTest::newRow("missing file") << QByteArray() << "missing" << 1000 << O::NotRead << 0;
     QTest::newRow("directory") << QByteArray() << "directory" << 1000 << O::NotRead << 0;
-    QTest::newRow("huge file") << QByteArray() << "huge" << 1000 << O::Refused << 0;
+    // Too large counts as missing, like any file InputFile refuses.
+    QTest::newRow("huge file") << QByteArray() << "huge" << 1000 << O::NotRead << 0;
+    QTest::newRow("internal DTD subset")
+        << QByteArray("<!DOCTYPE r [<!ENTITY a 'b'>]><r>&a;</r>") << QString() << 1000
+        << O::Refused << 0;
+    QTest::newRow("external DTD") << QByteArray("<!DOCTYPE r SYSTEM 'r.dtd'><r><a/></r>")
+                                  << QString() << 1000 << O::Parsed << 2;
     QTest::newRow("well-formed") << QByteArray("<r><a/><b/></r>") << QString() << 1000 << O::Parsed
                                  << 3;
     QTest::newRow("depth at the limit") << XmlSamples::deepDocument(3) << QString() << 3
@@ -127,7 +104,7 @@ void tst_XmlDepthGuard::parseFile()
         QVERIFY(CorvidTest::writeFile(path, xml));
 
     CountingHandler handler;
-    QCOMPARE(CrvC_XmlDepthGuard::parseFile(path, handler, maxDepth), outcome);
+    QCOMPARE(CrvC_XmlDepthGuard::parseFile(path, Port::InputFile::CoreReport, handler, maxDepth), outcome);
     QVERIFY(handler.elements <= maxElementsSeen);
     if (outcome == CrvC_XmlDepthGuard::Outcome::Parsed)
         QCOMPARE(handler.elements, maxElementsSeen);

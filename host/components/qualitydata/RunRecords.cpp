@@ -1,8 +1,9 @@
 #include "RunRecords.h"
 
+#include "host/InputFile.h"
+
 #include <QDateTime>
 #include <QFile>
-#include <QFileInfo>
 #include <QStringList>
 #include <QTextStream>
 
@@ -41,10 +42,9 @@ QString RunRecords::recordsPath(const QString &projectFile)
 
 bool RunRecords::read(const QString &path)
 {
-    if (!QFileInfo(path).isFile())
-        return false;
-    QFile file(path);
-    if (!file.open(QIODevice::ReadOnly | QIODevice::Text))
+    QFile file;
+    if (Port::InputFile::open(path, Port::InputFile::RunRecords, file)
+        != Port::InputFile::Status::Opened)
         return false;
     QTextStream in(&file);
     QString line;

@@ -1,0 +1,3 @@
+#include "DataCollectionEmailImpl.h"
+
+CrvC_DataCollectionEmailImpl::~CrvC_DataCollectionEmailImpl() = default;

@@ -1,0 +1,3 @@
+#include "ProxySource.h"
+
+CrvC_ProxySource::~CrvC_ProxySource() = default;

@@ -1,0 +1,86 @@
+#include "SendDispatcher.h"
+
+#include "DataCollectionEmail.h"
+#include "SendUsingSSL.h"
+#include "project/CorvidSettings.h"
+
+#include <QVariant>
+
+namespace {
+
+CrvC_SendDispatcher::Starter &starter()
+{
+    static CrvC_SendDispatcher::Starter hook;
+    return hook;
+}
+
+void startMethod(CrvC_SendDispatcher::Method method, const QString &tool, const QString &file)
+{
+    if (starter()) {
+        starter()(method, tool, file);
+        return;
+    }
+    if (method == CrvC_SendDispatcher::Method::Upload) {
+        // The upload deletes itself once its work is under way.
+        (new CrvC_SendUsingSSL())->SendFile(file);
+        return;
+    }
+    // send() returns once the program has started or its failure has been
+    // shown; the program runs on by itself.
+    CrvC_DataCollectionEmail email;
+    email.send(tool, CrvC_SendDispatcher::emailRecipient(), CrvC_SendDispatcher::emailSubject(),
+               QString(), file);
+}
+
+} // namespace
+
+void CrvC_SendDispatcher::setStarter(Starter hook)
+{
+    starter() = std::move(hook);
+}
+
+QString CrvC_SendDispatcher::emailRecipient()
+{
+    return QString::fromLatin1(CrvC_DataCollectionEmail::CollectionMailbox);
+}
+
+QString CrvC_SendDispatcher::emailSubject()
+{
+    return QStringLiteral("Corvid");
+}
+
+bool CrvC_SendDispatcher::sendReport(const QString &reportFile)
+{
+    if (CrvC_Settings::useSsl()) {
+        startMethod(Method::Upload, QString(), reportFile);
+        return true;
+    }
+    const QString tool = CrvC_Settings::selectedEmailTool();
+    if (tool.isEmpty())
+        return false;
+    startMethod(Method::Email, tool, reportFile);
+    return true;
+}
+
+bool CrvC_SendDispatcher::sendWithoutAsking(const QString &reportFile)
+{
+    return (CrvC_Settings::dontShowSendToDlg() || CrvC_Settings::useSsl()) && sendReport(reportFile);
+}
+
+CrvC_SendDispatcher::Choice CrvC_SendDispatcher::storedChoice()
+{
+    Choice choice;
+    choice.useSsl = CrvC_Settings::useSsl();
+    choice.dontShowAgain = CrvC_Settings::dontShowSendToDlg(true);
+    choice.emailTool = CrvC_Settings::selectedEmailTool();
+    return choice;
+}
+
+void CrvC_SendDispatcher::storeChoice(const Choice &initial, const Choice &chosen)
+{
+    if (chosen.useSsl != initial.useSsl)
+        CrvC_Settings::setValue(CrvC_Settings::UseSSL, chosen.useSsl);
+    CrvC_Settings::setValue(CrvC_Settings::DontShowSendToDlg, chosen.dontShowAgain);
+    if (chosen.emailTool != initial.emailTool)
+        CrvC_Settings::setValue(CrvC_Settings::SelectedEmailTool, chosen.emailTool);
+}

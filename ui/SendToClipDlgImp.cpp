@@ -1,0 +1,9 @@
+#include "SendToClipDlgImp.h"
+
+CrvC_SendToClipDlgImp::CrvC_SendToClipDlgImp()
+    : QWidget(nullptr)
+{
+    setupUi(this);
+}
+
+CrvC_SendToClipDlgImp::~CrvC_SendToClipDlgImp() = default;
