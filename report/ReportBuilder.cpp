@@ -28,10 +28,10 @@
 
 #include <atomic>
 #include <exception>
-#include <thread>
-#include <vector>
 #include <new>
 #include <system_error>
+#include <thread>
+#include <vector>
 
 const char *const CrvC_ReportBuilder::ReportFileName = "device_usage_statistics.html";
 
@@ -229,11 +229,11 @@ private:
             m_text += text;
             return;
         }
-        qsizetype keep = room;
+        qsizetype kept = room;
         // Never keep half of a surrogate pair.
-        if (keep > 0 && text.at(keep - 1).isHighSurrogate())
-            --keep;
-        m_text += QStringView(text).left(keep);
+        if (kept > 0 && text.at(kept - 1).isHighSurrogate())
+            --kept;
+        m_text += QStringView(text).left(kept);
         m_cut = true;
     }
 
