@@ -100,11 +100,16 @@ void TestOrbProject::createProject()
 {
     const QString file = m_work + QLatin1String("/fresh.orb");
     QString error;
+    const QDate day = QDate::currentDate();
     QVERIFY2(OrbProject::createProject(file, {QStringLiteral("Xc7"), QStringLiteral("xc7k70"),
                                               QStringLiteral("fbg676"), QStringLiteral("-1")},
                                        &error),
              qPrintable(error));
-    QCOMPARE(ProjectRepositoryValues::instance().projectAgeInDays(file), QStringLiteral("0"));
+    // Made today, or yesterday when midnight passed meanwhile.
+    const QString age = ProjectRepositoryValues::instance().projectAgeInDays(file);
+    QVERIFY2(age == QLatin1String("0")
+                 || (age == QLatin1String("1") && QDate::currentDate() != day),
+             qPrintable(age));
     const auto creationStamp = [&file] {
         QString stamp;
         RepositoryAccess::read(file, QLatin1String(RepositoryAccess::CreationSection),
