@@ -63,7 +63,6 @@ void TestPreferencePage::request_data()
 
     QTest::newRow("preference sheet") << 32 << true << 1;
     QTest::newRow("type 32 without a sheet") << 32 << false << 0;
-    QTest::newRow("type 0") << 0 << true << 0;
     QTest::newRow("type 33") << 33 << true << 0;
 }
 

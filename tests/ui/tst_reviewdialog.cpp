@@ -193,11 +193,7 @@ void TestReviewDialog::designNamePrompt()
     QFETCH(QString, design);
     // A design "led" with a synthesis report that names its device.
     CorvidTest::writeFile(QStringLiteral("led_map.ktp"), "Target Device  : ks3s500\nTarget Package : fg320\n");
-    QString title;
-    QString label;
     CorvidTest::onNextModal<QInputDialog>([&](QInputDialog *prompt) {
-        title = prompt->windowTitle();
-        label = prompt->labelText();
         if (typed.isNull()) {
             prompt->reject();
         } else {
@@ -208,8 +204,6 @@ void TestReviewDialog::designNamePrompt()
     CrvC_DataCollectionDialog dialog;
     dialog.createReport(newProject(QStringLiteral("prompt")), QString(), QStringLiteral("Kestrel"));
 
-    QCOMPARE(title, QStringLiteral("Corvid"));
-    QCOMPARE(label, QStringLiteral("Enter the design name:"));
     QVERIFY(!QApplication::overrideCursor());
     QVERIFY(QFileInfo(dialog.reportPath()).isFile());
     QCOMPARE(dialog.builder().data().targetDevice.isEmpty(), design.isEmpty());

@@ -80,7 +80,6 @@ void TestSendDecisions::storeChoice_data()
 
     const QVariant none;
     QTest::newRow("unchanged") << true << true << "a" << none << none;
-    QTest::newRow("unchanged, asking again") << true << false << "a" << none << none;
     QTest::newRow("to e-mail") << false << true << "a" << QVariant(false) << none;
     QTest::newRow("other program") << true << true << "b" << none << QVariant("b");
     QTest::newRow("remembered program gone") << true << true << "" << none << QVariant("");
