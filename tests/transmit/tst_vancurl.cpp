@@ -69,22 +69,16 @@ private Q_SLOTS:
         QTest::newRow("upload, options in any order")
             << "-F access=v9orn --cacert {CA} " + form + "-F regid=R-1 {URL}/upload" << 0 << "received" << 1;
         QTest::newRow("unreachable proxy") << "--proxy 127.0.0.1:9 --cacert {CA} {LOOKUP}" << 4 << "" << 0;
-        QTest::newRow("nothing listening") << "--cacert {CA} https://127.0.0.1:9/x" << 4 << "" << 0;
         QTest::newRow("wrong access code") << "--cacert {CA} " + form + "-F access=v9orm {URL}/upload" << 6 << "" << 0;
-        QTest::newRow("no access code") << "--cacert {CA} " + form + "{URL}/upload" << 6 << "" << 0;
-        QTest::newRow("no file field") << "--cacert {CA} -F domain=c.d -F access=v9orn {URL}/upload" << 6 << "" << 0;
         QTest::newRow("file field not a file")
             << "--cacert {CA} -F file_loc={REPORT} -F access=v9orn {URL}/upload" << 6 << "" << 0;
         QTest::newRow("body over the limit")
             << "--cacert {CA} -F file_loc=@{DIR}/big.html -F access=v9orn {URL}/upload" << 6 << "" << 0;
-        QTest::newRow("unknown topic")
-            << "--cacert {CA} {URL}/cgi-bin/SW_Docs_Redirect/sw_docs_redirect?topic=x" << 6 << "" << 0;
         QTest::newRow("wrong CA") << "--cacert {OTHERCA} {LOOKUP}" << 5 << "" << 0;
         QTest::newRow("system CAs only") << "{LOOKUP}" << 5 << "" << 0;
         QTest::newRow("CA file missing") << "--cacert {CA}.missing {LOOKUP}" << 5 << "" << 0;
         QTest::newRow("upload file missing")
             << "--cacert {CA} -F file_loc=@{REPORT}.missing -F access=v9orn {URL}/upload" << 3 << "" << 0;
-        QTest::newRow("no URL") << "--cacert {CA}" << 2 << "" << 0;
         QTest::newRow("option without value") << "{LOOKUP} --proxy" << 2 << "" << 0;
         QTest::newRow("unknown option") << "--insecure {LOOKUP}" << 2 << "" << 0;
         QTest::newRow("other scheme") << "file:///etc/hostname" << 2 << "" << 0;

@@ -77,22 +77,6 @@ private Q_SLOTS:
         QCOMPARE(page->objectName(), QStringLiteral("DataCollectionPage"));
     }
 
-    void pageOnlyForCorvidItem()
-    {
-        Gui::Clip::PropSheet sheet;
-        CrvC_PropPageCreator creator;
-        auto *other = new Gui::Clip::PropItem(QStringLiteral("Editor"), QStringLiteral("Editor"), QString(), "other");
-        other->setPropPageCreator(&creator, SLOT(OnCreatePrefPage(QWidget*,PropItem*)));
-        sheet.addItem(other, false, 1);
-        QWidget container;
-        QVERIFY(!other->createPage(&container));
-
-        // An item of no sheet gets no page either.
-        Gui::Clip::PropItem loose(QStringLiteral("Corvid"), QStringLiteral("Corvid"), QString(), "loose");
-        loose.setPropPageCreator(&creator, SLOT(OnCreatePrefPage(QWidget*,PropItem*)));
-        QVERIFY(!loose.createPage(&container));
-    }
-
     void loadAndApply_data()
     {
         QTest::addColumn<QVariant>("useSsl");

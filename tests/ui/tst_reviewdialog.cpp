@@ -61,7 +61,6 @@ private Q_SLOTS:
         const int intro = CrvC_DataCollectionDialog::IntroductionTab;
         QTest::newRow("send") << "send" << int(QDialog::Accepted) << "2" << intro;
         QTest::newRow("decline") << "decline" << int(QDialog::Rejected) << QString() << intro;
-        QTest::newRow("escape") << "escape" << int(QDialog::Rejected) << QString() << intro;
         QTest::newRow("close") << "close" << int(QDialog::Rejected) << QString() << intro;
         // These two only change the tab; the dialog is then declined.
         QTest::newRow("Verify Contents") << "verify" << int(QDialog::Rejected) << QString()
@@ -90,8 +89,6 @@ private Q_SLOTS:
                 sentWhileOpen = recorder.sends;
             } else if (action == QLatin1String("decline")) {
                 open->declineButton()->click();
-            } else if (action == QLatin1String("escape")) {
-                QTest::keyClick(open, Qt::Key_Escape);
             } else {
                 open->close();
             }
