@@ -84,6 +84,7 @@ private Q_SLOTS:
 
         m_server.files.insert("/wpad.dat", ProxyScriptText);
         m_server.files.insert("/loop.pac", "function FindProxyForURL(url, host) { while (true) {} }");
+        m_server.files.insert("/throws.pac", "function FindProxyForURL(url, host) { throw 'no'; }");
         m_server.files.insert("/syntax.pac", "function FindProxyForURL(url, host) { return \"PROXY");
         m_server.files.insert("/binary.pac", QByteArray("\x7f" "ELF\0\0\xff\xfe", 8));
         m_server.start();
@@ -105,6 +106,7 @@ private Q_SLOTS:
         QTest::newRow("maker's server") << "/wpad.dat" << "www.vantor.example" << "PROXY h:8080; DIRECT";
         QTest::newRow("other host") << "/wpad.dat" << "elsewhere.example" << "DIRECT";
         QTest::newRow("loops") << "/loop.pac" << "www.vantor.example" << "";
+        QTest::newRow("throws") << "/throws.pac" << "www.vantor.example" << "";
         QTest::newRow("syntax error") << "/syntax.pac" << "www.vantor.example" << "";
         QTest::newRow("binary") << "/binary.pac" << "www.vantor.example" << "";
         QTest::newRow("not found") << "/missing.pac" << "www.vantor.example" << "";
