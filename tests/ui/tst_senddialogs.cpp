@@ -137,7 +137,6 @@ private Q_SLOTS:
 
         QTest::newRow("five ticks") << "ticks" << false << 1 << true;
         QTest::newRow("Details, declined") << "details" << false << 0 << false;
-        QTest::newRow("Cancel, declined") << "cancel" << false << 0 << false;
         QTest::newRow("Cancel, sent in the review") << "cancel" << true << 1 << false;
         QTest::newRow("window closed") << "close" << false << 0 << false;
     }
