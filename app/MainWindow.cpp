@@ -4,6 +4,7 @@
 #include "host/gui/ApplicationBase.h"
 #include "host/gui/DataCollector.h"
 #include "host/gui/PropSheet.h"
+#include "host/gui/VantorUpdatePage.h"
 
 #include <QFileDialog>
 #include <QLabel>
@@ -39,6 +40,7 @@ void MainWindow::openFile()
 void MainWindow::showPreferences()
 {
     Gui::Clip::PropSheet sheet(this);
+    Gui::Clip::VantorUpdatePage::addTo(&sheet);
     Gui::Clip::DataCollector collector(Gui::Clip::DataCollector::PreferenceSheet, &sheet);
     static_cast<Gui::Clip::ApplicationBase *>(QCoreApplication::instance())->requestData(collector);
     if (sheet.itemCount() > 0)

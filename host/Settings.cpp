@@ -59,5 +59,18 @@ void Settings::setValue(const QString &key, const QVariant &value)
     store.sync();
 }
 
+void Settings::remove(const QString &key)
+{
+    if (!m_writable)
+        return;
+    QSettings store(userFileName(), QSettings::IniFormat);
+    store.beginGroup(m_group);
+    if (!store.contains(key))
+        return;
+    store.remove(key);
+    store.endGroup();
+    store.sync();
+}
+
 } // namespace Clip
 } // namespace Gui

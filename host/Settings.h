@@ -38,6 +38,8 @@ public:
     QVariant getValue(const QString &key, const QVariant &defaultValue = QVariant()) const;
     void setValue(const QString &key, const QVariant &value);
     bool contains(const QString &key) const;
+    // Removes `key`, under the same conditions as setValue.
+    void remove(const QString &key);
 
     // Path of the per-user settings file.
     static QString userFileName();

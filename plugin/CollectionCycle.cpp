@@ -13,8 +13,26 @@
 
 using Gui::Clip::String;
 
-QString CrvC_CollectionCycle::designName(const QString &fileName, CitI::IInterface *context)
+namespace {
+
+CrvC_CollectionCycle::Dialogs &dialogs()
 {
+    static CrvC_CollectionCycle::Dialogs hooks;
+    return hooks;
+}
+
+} // namespace
+
+void CrvC_CollectionCycle::setDialogs(Dialogs hooks)
+{
+    dialogs() = std::move(hooks);
+}
+
+QString CrvC_CollectionCycle::designName(const QString &fileName, CitI::IInterface *context,
+                                         bool *directoryEntered)
+{
+    if (directoryEntered)
+        *directoryEntered = true;
     if (context) {
         auto *open = static_cast<GuiI::IOpenContext *>(context->GetInterface(GuiI::IOpenContext::iid()));
         auto *provider = open ? static_cast<GuiI::IDesignNameProvider *>(
@@ -27,7 +45,11 @@ QString CrvC_CollectionCycle::designName(const QString &fileName, CitI::IInterfa
         return parts.size() >= 2 ? parts.at(1) : QString();
     }
     const QFileInfo file(fileName);
-    QDir::setCurrent(file.absolutePath());
+    // A folder that is gone or a link loop leaves the old current directory,
+    // whose files must not be taken for this design's.
+    const bool entered = QDir::setCurrent(file.absolutePath());
+    if (directoryEntered)
+        *directoryEntered = entered;
     QString name = file.baseName();
     const qsizetype cut = name.lastIndexOf(QLatin1Char('_'));
     if (cut >= 0)
@@ -56,9 +78,15 @@ void CrvC_CollectionCycle::currentProject(QString &projectFile, QString &targetF
 
 void CrvC_CollectionCycle::openUsageFile(const QString &fileName, CitI::IInterface *context)
 {
-    const QString design = designName(fileName, context);
+    bool entered = true;
+    const QString design = designName(fileName, context, &entered);
     Port_MsgManData::debugStub("Corvid: open %s (design \"%s\")\n", qUtf8Printable(fileName),
                                qUtf8Printable(design));
+    if (!entered) {
+        Port_MsgManData::debugStub("Corvid: cannot enter the folder of %s; nothing collected\n",
+                                   qUtf8Printable(fileName));
+        return;
+    }
     if (!fileName.endsWith(QLatin1String(".xml")))
         return;
 
@@ -66,7 +94,9 @@ void CrvC_CollectionCycle::openUsageFile(const QString &fileName, CitI::IInterfa
     QString targetFamily;
     currentProject(projectFile, targetFamily);
 
-    if (!projectFile.isEmpty() && !CrvC_Settings::isCollectionEnabled()) {
+    // The switch holds with and without a current project: a user or an
+    // administrator who switched collection off gets nothing built or sent.
+    if (!CrvC_Settings::isCollectionEnabled()) {
         Port_MsgManData::debugStub("Corvid: collection is switched off\n");
         return;
     }
@@ -76,7 +106,13 @@ void CrvC_CollectionCycle::openUsageFile(const QString &fileName, CitI::IInterfa
 void CrvC_CollectionCycle::startCollection(const QString &projectFile, const QString &designName,
                                            const QString &targetFamily)
 {
-    Port_MsgManData::debugStub("Corvid: collect design \"%s\", project \"%s\", family \"%s\"\n",
+    const bool atOnce = CrvC_Settings::dontShowSendProgressDlg();
+    Port_MsgManData::debugStub("Corvid: collect design \"%s\", project \"%s\", family \"%s\" (%s)\n",
                                qUtf8Printable(designName), qUtf8Printable(projectFile),
-                               qUtf8Printable(targetFamily));
+                               qUtf8Printable(targetFamily), atOnce ? "send at once" : "countdown");
+    const Starter &start = atOnce ? dialogs().sendAtOnce : dialogs().countDown;
+    if (start)
+        start(projectFile, designName, targetFamily);
+    else
+        Port_MsgManData::debugStub("Corvid: no dialogs installed\n");
 }

@@ -1,14 +1,73 @@
 #include "CorvidPlugin.h"
 #include "CollectionCycle.h"
+#include "ui/DataCollectionDialog.h"
 #include "ui/PropPageCreator.h"
+#include "ui/SendClipDlg.h"
+#include "ui/SendToClipDlg.h"
+
+#include "transmit/UserNotice.h"
 
 #include "host/FileSupervisor.h"
 #include "host/InstanceTable.h"
+#include "host/MsgManData.h"
 #include "host/String.h"
+#include "host/gui/Dialog.h"
 
 #include <QCoreApplication>
+#include <QMessageBox>
 
 using Gui::Clip::String;
+
+namespace {
+
+// What the parts without widgets need of the user: the host's warning box,
+// the send method dialog, and the windows of the collection cycle.
+void installHandlers()
+{
+    CrvC_UserNotice::setHandlers(
+        [](const QString &text) {
+            Gui::Clip::MessageBox::warning(nullptr, QCoreApplication::translate("CrvC_CorvidPlugin", "Corvid"),
+                                           text, QMessageBox::Ok);
+        },
+        [](const QString &reportFile) {
+            CrvC_SendToClipDlg::showSendMethodDialogForEmail(nullptr, reportFile);
+        });
+
+    CrvC_CollectionCycle::Dialogs dialogs;
+    dialogs.sendAtOnce = [](const QString &projectFile, const QString &designName,
+                            const QString &targetFamily) {
+        CrvC_DataCollectionDialog review(nullptr);
+        review.createReport(projectFile, designName, targetFamily);
+        // Without a new page (no design name given, the page could not be
+        // written) an older page may still lie there; it is not this report.
+        if (!review.builder().written()) {
+            Port_MsgManData::debugStub("Corvid: no report written, nothing sent\n");
+            return;
+        }
+        review.sendData();
+    };
+    dialogs.countDown = [](const QString &projectFile, const QString &designName,
+                           const QString &targetFamily) {
+        auto *countdown = new CrvC_SendClipDlg(nullptr, projectFile, designName, targetFamily);
+        if (!countdown->reviewDialog()->builder().written()) {
+            Port_MsgManData::debugStub("Corvid: no report written, nothing sent\n");
+            delete countdown;
+            return;
+        }
+        countdown->show();
+    };
+    CrvC_CollectionCycle::setDialogs(dialogs);
+}
+
+// The library may be unloaded after the plug-in object: nothing may keep
+// pointing into it.
+void removeHandlers()
+{
+    CrvC_UserNotice::setHandlers({}, {});
+    CrvC_CollectionCycle::setDialogs({});
+}
+
+} // namespace
 
 CrvC_CorvidPlugin::CrvC_CorvidPlugin()
 {
@@ -19,10 +78,12 @@ CrvC_CorvidPlugin::CrvC_CorvidPlugin()
             this, SLOT(onDataRequested(Gui::Clip::DataCollector&)));
     CitP::InstanceTable::RegisterInstance(GuiI::IFileEditorManager::iid(),
                                           static_cast<GuiI::IFileEditorManager *>(this));
+    installHandlers();
 }
 
 CrvC_CorvidPlugin::~CrvC_CorvidPlugin()
 {
+    removeHandlers();
     CitP::InstanceTable::UnRegisterInstance(static_cast<GuiI::IFileEditorManager *>(this));
     Gui::Clip::FileSupervisor::getInstance()->unregisterEditor(
         static_cast<GuiI::IFileEditorManager *>(this));

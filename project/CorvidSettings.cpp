@@ -1,5 +1,6 @@
 #include "CorvidSettings.h"
 
+#include "host/Identifier.h"
 #include "host/InputFile.h"
 #include "host/Settings.h"
 #include "host/VantorPath.h"
@@ -110,9 +111,7 @@ QString CrvC_Settings::selectedEmailTool()
 
 QString CrvC_Settings::newIdentifier()
 {
-    QString id = QUuid::createUuid().toString();
-    id.remove(QLatin1Char('{')).remove(QLatin1Char('}')).remove(QLatin1Char('-'));
-    return id;
+    return Port::Identifier::newIdentifier();
 }
 
 QString CrvC_Settings::randomId()

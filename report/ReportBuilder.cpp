@@ -9,6 +9,7 @@
 #include "VersionSection.h"
 
 #include "host/AutoRelease.h"
+#include "host/Identifier.h"
 #include "host/InstanceTable.h"
 #include "host/ProjectManager.h"
 #include "host/String.h"
@@ -16,27 +17,247 @@
 #include "project/CorvidSettings.h"
 
 #include <QCoreApplication>
+#include <QFileInfo>
 #include <QSaveFile>
-#include <QStringConverter>
+
+#include <QThread>
+
+#if defined(__GLIBC__)
+#include <malloc.h>
+#endif
+
+#include <atomic>
+#include <exception>
+#include <new>
+#include <system_error>
+#include <thread>
+#include <vector>
 
 const char *const CrvC_ReportBuilder::ReportFileName = "device_usage_statistics.html";
 
+// A little more than the review dialog shows of a large page (250,000
+// characters, cut there at a line end), so that it still sees the cut.
+const qsizetype CrvC_ReportBuilder::PageTextLimit = 256 * 1024;
+
 namespace {
 
-QString tr(const char *text)
+// The heading's texts are translated in the review dialog's context.
+const char *const HeadingContext = "CrvC_DataCollectionDialog";
+const char *const HeadingTexts[] = {
+    QT_TRANSLATE_NOOP("CrvC_DataCollectionDialog",
+                      "This HTML page displays the device usage statistics that will be sent to "
+                      "Vantor. "),
+    QT_TRANSLATE_NOOP("CrvC_DataCollectionDialog",
+                      "The file also contains predefined XML tags used to simplify processing."),
+    QT_TRANSLATE_NOOP("CrvC_DataCollectionDialog",
+                      "<BR>&nbsp;<BR>Please verify the contents are okay to send to "
+                      "Vantor!<BR>&nbsp;<BR><HR>&nbsp;<BR>"),
+};
+
+// Restores the busy cursor however the build ends.
+class BusyCursor
 {
-    return QCoreApplication::translate("CrvC_DataCollectionDialog", text);
+public:
+    explicit BusyCursor(const std::function<void(bool)> &setBusy)
+        : m_setBusy(setBusy)
+    {
+        if (m_setBusy)
+            m_setBusy(true);
+    }
+    ~BusyCursor()
+    {
+        if (m_setBusy)
+            m_setBusy(false);
+    }
+    BusyCursor(const BusyCursor &) = delete;
+    BusyCursor &operator=(const BusyCursor &) = delete;
+
+private:
+    const std::function<void(bool)> &m_setBusy;
+};
+
+// Hands memory that is free again back to the system: a large build leaves
+// much of it in the heaps of its threads, to no use until the next build.
+void releaseFreedMemory()
+{
+#if defined(__GLIBC__)
+    malloc_trim(0);
+#endif
 }
+
+// Runs the pure file readers side by side. The calling thread reads the
+// first reader (the largest), then helps the workers with the rest: one
+// worker per further processor core, two at most. Few threads rather than
+// one per reader: each thread allocates from a heap of its own that keeps
+// what it freed, so every extra thread adds to the peak memory of a build,
+// and the largest results are best kept in the calling thread's heap, which
+// the next build reuses.
+class ReaderPool
+{
+public:
+    explicit ReaderPool(std::vector<std::function<void()>> readers)
+        : m_readers(std::move(readers))
+        , m_failures(m_readers.size())
+    {
+        const int workers = qBound(1, QThread::idealThreadCount() - 1, 2);
+        for (int i = 0; i < workers; ++i) {
+            try {
+                m_threads.emplace_back([this] { work(); });
+            } catch (const std::system_error &) {
+                break; // the calling thread reads what no worker takes
+            }
+        }
+    }
+
+    ~ReaderPool() { join(); }
+
+    // Takes part in the reading until every reader is done, then rethrows
+    // the first failure of a reader, in reader order.
+    void finish()
+    {
+        if (!m_readers.empty())
+            run(0);
+        work();
+        join();
+        for (const std::exception_ptr &failure : m_failures) {
+            if (failure)
+                std::rethrow_exception(failure);
+        }
+    }
+
+private:
+    void work()
+    {
+        for (std::size_t i = m_next++; i < m_readers.size(); i = m_next++) {
+            run(i);
+            // What a reader needed only on the way may serve the others.
+            releaseFreedMemory();
+        }
+    }
+
+    void run(std::size_t i)
+    {
+        try {
+            m_readers[i]();
+        } catch (...) {
+            m_failures[i] = std::current_exception();
+        }
+    }
+
+    void join()
+    {
+        for (std::thread &thread : m_threads) {
+            if (thread.joinable())
+                thread.join();
+        }
+    }
+
+    std::vector<std::function<void()>> m_readers;
+    std::vector<std::exception_ptr> m_failures;
+    std::atomic<std::size_t> m_next{1}; // the first is the calling thread's
+    std::vector<std::thread> m_threads;
+};
 
 } // namespace
 
-CrvC_ReportBuilder::CrvC_ReportBuilder(Environment environment)
-    : m_env(std::move(environment))
+// The page as it is assembled: every line goes to the file at once, as UTF-8
+// with "\n" between lines, and into the kept beginning until that is full.
+class CrvC_ReportBuilder::PageWriter
 {
-    if (!m_env.now)
-        m_env.now = [] { return QDateTime::currentDateTime(); };
-    if (!m_env.newIdentifier)
-        m_env.newIdentifier = &CrvC_Settings::newIdentifier;
+public:
+    PageWriter(const QString &path, QString &text, bool &cut)
+        : m_file(path)
+        , m_text(text)
+        , m_cut(cut)
+    {
+        m_text.clear();
+        m_cut = false;
+        // QSaveFile would replace the link's target; the page goes only
+        // where the report path itself says.
+        if (!QFileInfo(path).isSymLink())
+            m_open = m_file.open(QIODevice::WriteOnly);
+    }
+
+    void operator()(const QString &line)
+    {
+        if (m_lines++ > 0)
+            add(QStringLiteral("\n"));
+        add(line);
+    }
+
+    // A line already encoded, as the readers hand back their large sections.
+    void utf8(const QByteArray &line)
+    {
+        if (m_lines++ > 0)
+            add(QStringLiteral("\n"));
+        write(line);
+        if (!m_cut)
+            keep(QString::fromUtf8(line));
+    }
+
+    // True when the whole page is in place of the previous file.
+    bool commit() { return m_open && m_file.commit(); }
+
+private:
+    void add(const QString &text)
+    {
+        // A long line is encoded a slice at a time rather than copied whole.
+        const qsizetype slice = 1 << 16;
+        QStringView rest(text);
+        while (m_open && !rest.isEmpty()) {
+            qsizetype n = qMin(slice, rest.size());
+            if (n < rest.size() && rest.at(n - 1).isHighSurrogate())
+                ++n;
+            write(rest.left(n).toUtf8());
+            rest = rest.mid(n);
+        }
+        keep(text);
+    }
+
+    void write(const QByteArray &bytes)
+    {
+        if (m_open && m_file.write(bytes) != bytes.size())
+            m_open = false; // QSaveFile keeps the old file; commit fails
+    }
+
+    void keep(const QString &text)
+    {
+        if (m_cut)
+            return;
+        const qsizetype room = PageTextLimit - m_text.size();
+        if (text.size() <= room) {
+            m_text += text;
+            return;
+        }
+        qsizetype kept = room;
+        // Never keep half of a surrogate pair.
+        if (kept > 0 && text.at(kept - 1).isHighSurrogate())
+            --kept;
+        m_text += QStringView(text).left(kept);
+        m_cut = true;
+    }
+
+    QSaveFile m_file;
+    bool m_open = false;
+    qsizetype m_lines = 0;
+    QString &m_text;
+    bool &m_cut;
+};
+
+CrvC_ReportBuilder::Environment CrvC_ReportBuilder::withDefaults(Environment environment)
+{
+    if (!environment.now)
+        environment.now = [] { return QDateTime::currentDateTime(); };
+    if (!environment.newIdentifier)
+        environment.newIdentifier = &Port::Identifier::newIdentifier;
+    if (!environment.randomId)
+        environment.randomId = &CrvC_Settings::randomId;
+    return environment;
+}
+
+CrvC_ReportBuilder::CrvC_ReportBuilder(Environment environment)
+    : m_env(withDefaults(std::move(environment)))
+{
     m_data.reportPath = projectFilePath(QString::fromLatin1(ReportFileName));
 }
 
@@ -84,6 +305,7 @@ void CrvC_ReportBuilder::buildReport(const QString &projectFileArg, QString desi
     m_data.projectFile = projectFileArg.endsWith(QLatin1String(".orb"), Qt::CaseInsensitive)
                              ? projectFileArg
                              : projectFileArg + QLatin1String(".orb");
+    m_data.projectGiven = !projectFileArg.isEmpty();
 
     if (designName.isEmpty() && m_env.askDesignName) {
         QString entered;
@@ -91,57 +313,105 @@ void CrvC_ReportBuilder::buildReport(const QString &projectFileArg, QString desi
             designName = entered.trimmed();
     }
 
-    if (m_env.setBusy)
-        m_env.setBusy(true);
+    m_written = false;
+    BusyCursor busy(m_env.setBusy);
+    try {
+        PageWriter page(m_data.reportPath, m_page, m_pageCut);
+        assemble(designName, page);
+        m_written = page.commit();
+    } catch (const std::bad_alloc &) {
+        // The unfinished page is dropped; the previous file stays.
+        m_written = false;
+        m_pageCut = true;
+    }
+    releaseFreedMemory();
+}
+
+void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
+{
+    const QString directory = projectDirectory();
+    const auto inProject = [&directory](const QString &name) {
+        return directory.isEmpty() ? name : directory + QLatin1Char('/') + name;
+    };
+    const QString mapReport = inProject(designName + QLatin1String("_map.ktp"));
+    const QString synthesisReport = inProject(designName + QLatin1String(".snx"));
+    const QString usageXml = inProject(designName + QLatin1String("_usage.xml"));
+    const QString commandLog = inProject(designName + QLatin1String(".cmd_log"));
+    const QString fuseLog = inProject(QStringLiteral("fuse.log"));
+    const QString coresReport = inProject(designName + QLatin1String("_lnkgen.drpt"));
+    const QString parPage = inProject(QStringLiteral("par_usage_statistics.html"));
+    const QString osimPage = inProject(QStringLiteral("osim/osim_usage_statistics.html"));
+
+    // The pure file readers start at once, each on a copy of the fields (the
+    // copies share their contents until a reader adds to them). The later
+    // sections come back encoded: half the memory while they wait for their
+    // turn.
+    const CrvC_ReportData start = m_data;
+    CrvC_ReportData usage = start, macros = start, commands = start;
+    QByteArray history, help, cores, par, osim;
+    // Largest first: the usage XML for the calling thread, then what needs
+    // most memory on the way, while the usage tables are still small.
+    ReaderPool readers({
+        [&] { CrvC_UsageXml::readUsageXml(usageXml, usage); },
+        [&] {
+            CrvC_CommandLog::readCommandLog(commandLog, commands);
+            CrvC_CommandLog::checkFuseLog(fuseLog, commands);
+            if (commands.commandHistory.isEmpty())
+                return;
+            const QString text = CrvC_CommandLog::commandLineHistorySection(commands);
+            commands.commandHistory.clear();
+            history = text.toUtf8();
+        },
+        [&] { cores = CrvC_CoresStatistics().sectionText(coresReport).toUtf8(); },
+        [&] { help = CrvC_HelpViewerData().sectionText().toUtf8(); },
+        [&] { CrvC_SynthesisReport::readMacroStatistics(synthesisReport, macros); },
+        [&] { par = CrvC_RunStatistics::parUsageSection(parPage).toUtf8(); },
+        [&] { osim = CrvC_RunStatistics::osimUsageSection(osimPage).toUtf8(); },
+    });
 
     const QString fileName = QString::fromLatin1(ReportFileName);
-    QStringList lines;
-    lines.reserve(32);
-    lines << QStringLiteral("<HTML><HEAD><TITLE>Device Usage Statistics Report</TITLE></HEAD>")
-          << QStringLiteral("<BODY TEXT='#000000' BGCOLOR='#FFFFFF' LINK='#0000EE' "
-                            "VLINK='#551A8B' ALINK='#FF0000'>");
-    lines << QLatin1String("<H3>Device Usage Page (") + fileName + QLatin1String(")</H3>")
-                 + tr("This HTML page displays the device usage statistics that will be sent to "
-                      "Vantor. ")
-                 + tr("The file also contains predefined XML tags used to simplify processing.")
-                 + tr("<BR>&nbsp;<BR>Please verify the contents are okay to send to "
-                      "Vantor!<BR>&nbsp;<BR><HR>&nbsp;<BR>");
+    page(QStringLiteral("<HTML><HEAD><TITLE>Device Usage Statistics Report</TITLE></HEAD>"));
+    page(QStringLiteral("<BODY TEXT='#000000' BGCOLOR='#FFFFFF' LINK='#0000EE' "
+                        "VLINK='#551A8B' ALINK='#FF0000'>"));
+    QString heading = QLatin1String("<H3>Device Usage Page (") + fileName + QLatin1String(")</H3>");
+    for (const char *text : HeadingTexts)
+        heading += QCoreApplication::translate(HeadingContext, text);
+    page(heading);
 
-    CrvC_SynthesisReport::readTargetInfo(projectFilePath(designName + QLatin1String("_map.ktp")),
-                                         m_data);
-    lines << CrvC_VersionSection::versionSection(m_data, m_env);
-    CrvC_SynthesisReport::readMacroStatistics(projectFilePath(designName + QLatin1String(".snx")),
-                                              m_data);
-    CrvC_UsageXml::readUsageXml(projectFilePath(designName + QLatin1String("_usage.xml")), m_data);
-    CrvC_CommandLog::readCommandLog(projectFilePath(designName + QLatin1String(".cmd_log")), m_data);
-    CrvC_CommandLog::checkFuseLog(projectFilePath(QStringLiteral("fuse.log")), m_data);
+    // The host, the repository and the settings are asked on this thread,
+    // while the readers work; then it reads along with them.
+    CrvC_SynthesisReport::readTargetInfo(mapReport, m_data);
+    page(CrvC_VersionSection::versionSection(m_data, m_env));
+    const QString runStatistics = CrvC_RunStatistics::runStatisticsSection(m_data.projectFileToOpen());
+    const QString projectStatistics = CrvC_ProjectStatistics::projectStatisticsSection(
+        m_data.projectFileToOpen(), m_env.now().date());
+    readers.finish();
 
-    CrvC_UsageXml::appendTables(m_data, lines);
+    m_data.macroStatistics.swap(macros.macroStatistics);
+    m_data.usageXmlPath = usage.usageXmlPath;
+    m_data.designStatistics.swap(usage.designStatistics);
+    m_data.deviceUsage.swap(usage.deviceUsage);
+    m_data.reportConfigData.swap(usage.reportConfigData);
+    m_data.reportPinData.swap(usage.reportPinData);
+    m_data.reportConfigDataCount = usage.reportConfigDataCount;
+    m_data.reportPinDataCount = usage.reportPinDataCount;
+    CrvC_Lines tables([&page](const QString &line) { page(line); });
+    CrvC_UsageXml::appendTables(m_data, tables);
+    // Written: the tables need not stay in memory.
+    m_data.macroStatistics.clear();
+    m_data.designStatistics.clear();
+    m_data.deviceUsage.clear();
+    m_data.reportConfigData.clear();
+    m_data.reportPinData.clear();
 
-    if (!m_data.commandHistory.isEmpty())
-        lines << CrvC_CommandLog::commandLineHistorySection(m_data);
-    lines << CrvC_RunStatistics::runStatisticsSection(m_data.projectFile);
-    lines << CrvC_HelpViewerData().sectionText();
-    lines << CrvC_ProjectStatistics::projectStatisticsSection(m_data.projectFile, m_env.now().date());
-    lines << CrvC_CoresStatistics().sectionText(
-        projectFilePath(designName + QLatin1String("_lnkgen.drpt")));
-    lines << CrvC_RunStatistics::parUsageSection(
-        projectFilePath(QStringLiteral("par_usage_statistics.html")));
-    lines << CrvC_RunStatistics::osimUsageSection(
-        projectFilePath(QStringLiteral("osim/osim_usage_statistics.html")));
-    lines << QStringLiteral("</BODY></HTML>");
-
-    m_page = lines.join(QLatin1Char('\n'));
-
-    // Written through a temporary file, so that a failure half-way never
-    // leaves a cut-off page in place of the previous one.
-    m_written = false;
-    QSaveFile file(m_data.reportPath);
-    if (file.open(QIODevice::WriteOnly)) {
-        file.write(m_page.toUtf8());
-        m_written = file.commit();
-    }
-
-    if (m_env.setBusy)
-        m_env.setBusy(false);
+    if (!history.isEmpty())
+        page.utf8(history);
+    history.clear();
+    page(runStatistics);
+    page.utf8(help);
+    page(projectStatistics);
+    page.utf8(cores);
+    page.utf8(par);
+    page.utf8(osim);
+    page(QStringLiteral("</BODY></HTML>"));
 }

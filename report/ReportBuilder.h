@@ -13,25 +13,43 @@
 // page as UTF-8. Needs no window: what would involve the user (asking for a
 // design name, the busy cursor) goes through the environment hooks, which
 // the review dialog supplies.
+//
+// The file readers run side by side, on the calling thread and a worker
+// thread or two, each on builder data of its own; whatever needs the host's
+// project manager, the repository or the settings stays on the calling
+// thread. The page goes to the file
+// line by line as it is assembled, so a large project never has the whole
+// page in memory: the builder keeps only its beginning, for the review.
 class CrvC_ReportBuilder
 {
 public:
     static const char *const ReportFileName; // "device_usage_statistics.html"
 
-    // Hooks into the world outside the builder. Unset hooks do nothing
-    // (askDesignName answers "cancelled"), and the defaults of now and
-    // newIdentifier are the clock and a random UUID.
+    // How much of the page pageText() keeps, in UTF-16 code units: the
+    // beginning that the review dialog's Contents tab shows.
+    static const qsizetype PageTextLimit;
+
+    // Hooks into the world outside the builder. Unset hooks of the user
+    // do nothing (askDesignName answers "cancelled"); unset clock and
+    // identifier hooks get their defaults (withDefaults).
     struct Environment
     {
         // Asks the user for a design name; false when cancelled.
         std::function<bool(QString &designName)> askDesignName;
         // Shows (true) or restores (false) the busy cursor.
         std::function<void(bool busy)> setBusy;
-        // The current local date and time ("Date Generated").
+        // The current local date and time ("Date Generated", project age).
         std::function<QDateTime()> now;
         // A new random identifier, 32 lower-case hexadecimal digits.
         std::function<QString()> newIdentifier;
+        // The user's own random identifier, made and kept on first use.
+        std::function<QString()> randomId;
     };
+
+    // `environment` with the defaults for its unset clock and identifier
+    // hooks: the local clock, Port::Identifier::newIdentifier and
+    // CrvC_Settings::randomId. The one place these defaults are chosen.
+    static Environment withDefaults(Environment environment);
 
     // reportPath := projectFilePath(ReportFileName), resolved now.
     explicit CrvC_ReportBuilder(Environment environment = Environment());
@@ -40,13 +58,19 @@ public:
     void createReport(const QString &projectFileArg, const QString &designName,
                       const QString &targetFamily);
 
-    // Builds the page, keeps it as pageText() and writes it to reportPath.
-    // The previous file is replaced only by a complete new one.
+    // Builds the page and writes it to reportPath. The previous file is
+    // replaced only by a complete new one; a symbolic link at reportPath is
+    // never written through. Running out of memory ends the build with the
+    // page unwritten; the busy cursor is restored on every way out.
     void buildReport(const QString &projectFileArg, QString designName);
 
+    // What the Contents tab shows: the page, or its first PageTextLimit
+    // code units when pageCut().
     QString pageText() const { return m_page; }
+    bool pageCut() const { return m_pageCut; }
     // True when the last build wrote the file.
     bool written() const { return m_written; }
+    QString reportPath() const { return m_data.reportPath; }
 
     // projectDirectory() + "/" + name, or name when there is no project directory.
     static QString projectFilePath(const QString &name);
@@ -57,6 +81,9 @@ public:
     // The send iteration of this report (cached after the first call).
     QString projectIteration();
 
+    // The fields of the last build. What only fills the page's tables (the
+    // usage XML's tables, the macro statistics, the command history) is let
+    // go once written; the target, identifiers and paths stay.
     CrvC_ReportData &data() { return m_data; }
     const CrvC_ReportData &data() const { return m_data; }
     const Environment &environment() const { return m_env; }
@@ -65,8 +92,12 @@ public:
     void setReportPath(const QString &path) { m_data.reportPath = path; }
 
 private:
+    class PageWriter;
+    void assemble(const QString &designName, PageWriter &page);
+
     Environment m_env;
     CrvC_ReportData m_data;
     QString m_page;
+    bool m_pageCut = false;
     bool m_written = false;
 };

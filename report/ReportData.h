@@ -7,12 +7,17 @@
 #include <QStringBuilder>
 #include <QStringList>
 
+#include <functional>
+
 // The fields one report build fills and reads. Owned by the report builder;
 // valid for one build only (a new report uses a new builder).
 struct CrvC_ReportData
 {
     // Given by the caller and resolved by the builder.
     QString projectFile; // always ends in ".orb" after a build
+    // False when the caller named no project file: projectFile is then ".orb"
+    // for the page, but nothing named after it is opened.
+    bool projectGiven = true;
     QString reportPath;  // where the page is written
     QString targetFamily;
 
@@ -39,6 +44,34 @@ struct CrvC_ReportData
 
     // Send iteration shown in the report; computed once per build.
     QString projectIteration;
+
+    // The project file that readers of project-named files (repository, run
+    // records) open: empty when the caller named none.
+    QString projectFileToOpen() const { return projectGiven ? projectFile : QString(); }
+};
+
+// Where a section's lines go, one at a time and in page order: straight into
+// the page as it is written, or into a list.
+class CrvC_Lines
+{
+public:
+    explicit CrvC_Lines(std::function<void(const QString &line)> take)
+        : m_take(std::move(take))
+    {
+    }
+    explicit CrvC_Lines(QStringList &list)
+        : m_take([&list](const QString &line) { list.append(line); })
+    {
+    }
+
+    CrvC_Lines &operator<<(const QString &line)
+    {
+        m_take(line);
+        return *this;
+    }
+
+private:
+    std::function<void(const QString &line)> m_take;
 };
 
 // The dtag mark-up that the tables share: a group is its head line, the list

@@ -232,7 +232,7 @@ void UsageWalker::readAttrib(Frame &item, const QXmlStreamAttributes &attributes
 }
 
 // A group's head line and, when it has a name and items, its list line.
-void appendGroupHead(QStringList &lines, const QString &name, const QStringList &items)
+void appendGroupHead(CrvC_Lines &lines, const QString &name, const QStringList &items)
 {
     lines << CrvC_Markup::groupHead(name);
     if (!name.isEmpty() && !items.isEmpty())
@@ -244,7 +244,7 @@ const QLatin1String CellBreak("</TD><TD>");
 // The Configuration Data and Pin Data tables: the groups are spread over
 // cells, aiming at four columns of about count / 4 items each.
 void appendSpreadTable(const char *title, const QMap<QString, QStringList> &table, qint32 count,
-                       QStringList &lines)
+                       CrvC_Lines &lines)
 {
     lines << QLatin1String("&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>")
           << QLatin1String("<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=4><B>")
@@ -305,6 +305,12 @@ bool CrvC_UsageXml::readUsageXml(const QString &path, CrvC_ReportData &data)
 }
 
 void CrvC_UsageXml::appendTables(const CrvC_ReportData &data, QStringList &lines)
+{
+    CrvC_Lines out(lines);
+    appendTables(data, out);
+}
+
+void CrvC_UsageXml::appendTables(const CrvC_ReportData &data, CrvC_Lines &lines)
 {
     lines << QStringLiteral("&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>")
           << QStringLiteral("<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=4><B>Device Usage "

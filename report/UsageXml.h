@@ -15,7 +15,8 @@ public:
     // Reads the file as a stream, in one pass. Groups inside groups are
     // stored under their own names, each with its own items.
     static bool readUsageXml(const QString &path, CrvC_ReportData &data);
-    // Appends the report lines of the three tables (the last two only when
-    // they have groups).
+    // Hands on the report lines of the three tables (the last two only when
+    // they have groups), one line at a time.
+    static void appendTables(const CrvC_ReportData &data, CrvC_Lines &lines);
     static void appendTables(const CrvC_ReportData &data, QStringList &lines);
 };

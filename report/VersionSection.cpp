@@ -3,7 +3,6 @@
 #include "host/Env.h"
 #include "host/String.h"
 #include "host/Version.h"
-#include "project/CorvidSettings.h"
 #include "project/ProjectRepositoryValues.h"
 
 
@@ -38,21 +37,22 @@ QString CrvC_VersionSection::reportRegistrationId()
 QString CrvC_VersionSection::projectId(const CrvC_ReportData &data,
                                        const CrvC_ReportBuilder::Environment &environment)
 {
-    const QString fresh = environment.newIdentifier ? environment.newIdentifier()
-                                                    : CrvC_Settings::newIdentifier();
-    return ProjectRepositoryValues::instance().projectIdentifier(data.projectFile, fresh);
+    const QString fresh = CrvC_ReportBuilder::withDefaults(environment).newIdentifier();
+    return ProjectRepositoryValues::instance().projectIdentifier(data.projectFileToOpen(), fresh);
 }
 
 QString CrvC_VersionSection::projectIteration(CrvC_ReportData &data)
 {
     if (data.projectIteration.isEmpty())
-        data.projectIteration = ProjectRepositoryValues::instance().sendIteration(data.projectFile);
+        data.projectIteration =
+            ProjectRepositoryValues::instance().sendIteration(data.projectFileToOpen());
     return data.projectIteration;
 }
 
 QString CrvC_VersionSection::versionSection(CrvC_ReportData &data,
-                                            const CrvC_ReportBuilder::Environment &environment)
+                                            const CrvC_ReportBuilder::Environment &hooks)
 {
+    const CrvC_ReportBuilder::Environment environment = CrvC_ReportBuilder::withDefaults(hooks);
     const QString product = versionValue("product");
     const QString version = versionValue("version");
     const QString registrationId = reportRegistrationId();
@@ -60,11 +60,11 @@ QString CrvC_VersionSection::versionSection(CrvC_ReportData &data,
     const QString label = productConfigurationLabel(data.targetDevice);
 
     // Computed in this order: random, project, iteration.
-    const QString random = CrvC_Settings::randomId();
+    const QString random = environment.randomId();
     const QString project = projectId(data, environment);
     const QString iteration = projectIteration(data);
 
-    const QDateTime now = environment.now ? environment.now() : QDateTime::currentDateTime();
+    const QDateTime now = environment.now();
 
     static const QLatin1String rowStart("<TR ALIGN=LEFT>");
     static const QLatin1String rowEnd("</TR>");

@@ -10,7 +10,8 @@ class CrvC_VersionSection
 public:
     // The whole table, its lines joined with "\n". Makes the user's random
     // identifier on first use and the project identifier of a project file
-    // that has none yet.
+    // that has none yet. Unset hooks of `environment` get the builder's
+    // defaults (CrvC_ReportBuilder::withDefaults).
     static QString versionSection(CrvC_ReportData &data,
                                   const CrvC_ReportBuilder::Environment &environment);
 
@@ -18,7 +19,7 @@ public:
     // stored counter when it is a base-10 integer, otherwise "1".
     static QString projectIteration(CrvC_ReportData &data);
 
-    // The project's identifier from the repository of data.projectFile. A
+    // The project's identifier from the repository of data.projectFileToOpen(). A
     // project file without one gets environment.newIdentifier() stored; without
     // a project file the new identifier is used for this report only.
     static QString projectId(const CrvC_ReportData &data,

@@ -187,7 +187,7 @@ void CrvC_DataCollectionDialog::showContents()
 void CrvC_DataCollectionDialog::sendData()
 {
     CrvC_SendToClipDlg::showSendMethodDialog(this, QFileInfo(reportPath()).absoluteFilePath());
-    ProjectRepositoryValues::instance().countSend(m_builder.data().projectFile,
+    ProjectRepositoryValues::instance().countSend(m_builder.data().projectFileToOpen(),
                                                   m_builder.projectIteration());
 }
 

@@ -4,6 +4,7 @@
 
 #include <QAbstractButton>
 #include <QDesktopServices>
+#include <QDir>
 #include <QGuiApplication>
 #include <QMessageBox>
 #include <QUrl>
@@ -105,9 +106,35 @@ int MessageBox::warning(QWidget *parent, const QString &caption, const QString &
                                 QMessageBox::StandardButton(defaultButton));
 }
 
+namespace {
+
+HelpManager::Launcher &launcher()
+{
+    static HelpManager::Launcher current;
+    return current;
+}
+
+bool launch(const QUrl &url)
+{
+    if (!url.isValid() || url.isEmpty())
+        return false;
+    return launcher() ? launcher()(url) : QDesktopServices::openUrl(url);
+}
+
+} // namespace
+
+void HelpManager::setLauncher(Launcher replacement)
+{
+    launcher() = std::move(replacement);
+}
+
 bool HelpManager::runWebBrowser(const QString &url)
 {
-    return QDesktopServices::openUrl(QUrl(url));
+    const QString text = url.trimmed();
+    if (text.isEmpty())
+        return false;
+    // A path names a local file (the review dialog opens whole pages that way).
+    return launch(QUrl::fromUserInput(text, QDir::currentPath()));
 }
 
 bool HelpManager::showHelpTopic(const QString &helpFile, const QString &topic)
@@ -117,7 +144,7 @@ bool HelpManager::showHelpTopic(const QString &helpFile, const QString &topic)
     QUrl url = QUrl::fromLocalFile(helpFile);
     if (!topic.isEmpty())
         url.setFragment(topic);
-    return QDesktopServices::openUrl(url);
+    return launch(url);
 }
 
 } // namespace Clip

@@ -5,6 +5,10 @@
 #include <QDialog>
 #include <QPointer>
 
+#include <functional>
+
+class QUrl;
+
 class QAbstractButton;
 class QBoxLayout;
 
@@ -65,9 +69,18 @@ public:
 class ORBHOSTGUI_EXPORT HelpManager
 {
 public:
-    // Opens `url` in the user's browser; false when that failed.
+    // Opens `url` (an address, or a local file path) in the user's browser;
+    // false when that failed or `url` is empty.
     static bool runWebBrowser(const QString &url);
+    // Opens the help file at `topic` the same way; false without a help file.
     static bool showHelpTopic(const QString &helpFile, const QString &topic);
+
+    // What starts the browser; the default hands the address to the desktop
+    // (QDesktopServices, whose URL handlers apply; the offscreen platform
+    // opens nothing). Tests install their own so that no browser is ever
+    // launched; an empty function restores the default.
+    using Launcher = std::function<bool(const QUrl &url)>;
+    static void setLauncher(Launcher launcher);
 };
 
 } // namespace Clip

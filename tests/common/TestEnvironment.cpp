@@ -6,6 +6,7 @@
 #include <QFile>
 #include <QFileInfo>
 #include <QProcess>
+#include <QRegularExpression>
 #include <QStandardPaths>
 
 namespace CorvidTest {
@@ -79,6 +80,19 @@ QByteArray readFile(const QString &path)
 {
     QFile file(path);
     return file.open(QIODevice::ReadOnly) ? file.readAll() : QByteArray();
+}
+
+QString cellText(const QString &html)
+{
+    static const QRegularExpression cellEnd(QStringLiteral("</TD>"), QRegularExpression::CaseInsensitiveOption);
+    static const QRegularExpression tag(QStringLiteral("<[^>]*>"));
+    static const QRegularExpression blanksAround(QStringLiteral(" ?\\| ?"));
+    return QString(html)
+        .replace(cellEnd, QStringLiteral("|"))
+        .remove(tag)
+        .replace(QLatin1String("&nbsp;"), QLatin1String(" "))
+        .simplified()
+        .replace(blanksAround, QStringLiteral("|"));
 }
 
 } // namespace CorvidTest

@@ -30,32 +30,24 @@ bool TestCertificates::create(const QString &dir, const QString &caName)
     m_dir = dir;
     m_error.clear();
     QDir().mkpath(dir);
-    const QStringList ecKey = {QStringLiteral("-newkey"), QStringLiteral("ec"), QStringLiteral("-pkeyopt"),
-                               QStringLiteral("ec_paramgen_curve:prime256v1"), QStringLiteral("-nodes")};
-    const QString serial =
-        QStringLiteral("0x") + QString::number(QRandomGenerator::global()->generate64() >> 1, 16);
     if (!writeFile(dir + QLatin1String("/server.ext"),
                    "subjectAltName=IP:127.0.0.1,DNS:localhost\nbasicConstraints=CA:FALSE\n"
                    "extendedKeyUsage=serverAuth\n")) {
         m_error = QStringLiteral("cannot write in ") + dir;
         return false;
     }
-    return openssl(QStringList{QStringLiteral("req"), QStringLiteral("-x509")} + ecKey
-                   + QStringList{QStringLiteral("-keyout"), QStringLiteral("ca.key"), QStringLiteral("-out"),
-                                 QStringLiteral("ca.crt"), QStringLiteral("-days"), QStringLiteral("2"),
-                                 QStringLiteral("-subj"), QLatin1String("/CN=") + caName,
-                                 QStringLiteral("-addext"), QStringLiteral("basicConstraints=critical,CA:TRUE"),
-                                 QStringLiteral("-addext"),
-                                 QStringLiteral("keyUsage=critical,keyCertSign,cRLSign")})
-           && openssl(QStringList{QStringLiteral("req"), QStringLiteral("-new")} + ecKey
-                      + QStringList{QStringLiteral("-keyout"), QStringLiteral("server.key"),
-                                    QStringLiteral("-out"), QStringLiteral("server.csr"),
-                                    QStringLiteral("-subj"), QStringLiteral("/CN=127.0.0.1")})
-           && openssl({QStringLiteral("x509"), QStringLiteral("-req"), QStringLiteral("-in"),
-                       QStringLiteral("server.csr"), QStringLiteral("-CA"), QStringLiteral("ca.crt"),
-                       QStringLiteral("-CAkey"), QStringLiteral("ca.key"), QStringLiteral("-set_serial"), serial,
-                       QStringLiteral("-days"), QStringLiteral("2"), QStringLiteral("-extfile"),
-                       QStringLiteral("server.ext"), QStringLiteral("-out"), QStringLiteral("server.crt")});
+    const QString key = QStringLiteral("-newkey ec -pkeyopt ec_paramgen_curve:prime256v1 -nodes ");
+    const QString serial = QString::number(QRandomGenerator::global()->generate64() >> 1, 16);
+    auto words = [](const QString &line) { return line.split(QLatin1Char(' ')); };
+    return openssl(words(QLatin1String("req -x509 ") + key
+                         + QLatin1String("-days 2 -keyout ca.key -out ca.crt -addext basicConstraints=critical,CA:TRUE "
+                                         "-addext keyUsage=critical,keyCertSign,cRLSign -subj"))
+                   << QLatin1String("/CN=") + caName)
+           && openssl(words(QLatin1String("req -new ") + key
+                            + QLatin1String("-keyout server.key -out server.csr -subj /CN=127.0.0.1")))
+           && openssl(words(QLatin1String("x509 -req -in server.csr -CA ca.crt -CAkey ca.key -days 2 "
+                                          "-extfile server.ext -out server.crt -set_serial 0x")
+                            + serial));
 }
 
 TestServer::TestServer()
@@ -95,10 +87,8 @@ bool TestServer::start(const QStringList &extraArguments)
     m_process.reset(new QProcess);
     m_process->setProcessChannelMode(QProcess::MergedChannels);
     m_process->start(Environment::stageDir() + QLatin1String("/bin/corvid-receiver"),
-                     QStringList{QStringLiteral("--listen"), QStringLiteral("127.0.0.1"),
-                                 QStringLiteral("--port"), QStringLiteral("0"), QStringLiteral("--data"),
-                                 dataDir(), QStringLiteral("--cert"), m_certificates.certFile(),
-                                 QStringLiteral("--key"), m_certificates.keyFile()}
+                     QStringList{"--listen", "127.0.0.1", "--port", "0", "--data", dataDir(), "--cert",
+                                 m_certificates.certFile(), "--key", m_certificates.keyFile()}
                          + extraArguments);
     if (!m_process->waitForStarted(10000)) {
         m_error = QStringLiteral("cannot start corvid-receiver: ") + m_process->errorString();

@@ -33,11 +33,8 @@ private:
 
 // The staged corvid-receiver on 127.0.0.1 with a free port, its own
 // certificates and its own data folder; stopped by stop() or the destructor.
-//
-//   CorvidTest::TestServer server;
-//   QVERIFY2(server.start(), qPrintable(server.error()));
-//   qputenv("CORVID_SERVER", server.baseUrl().toUtf8());
-//   env.writeDataFile("reports/ca-cert-bundle.crt", readFile(server.caFile()));
+// Point CORVID_SERVER at baseUrl() and the data file
+// reports/ca-cert-bundle.crt at caFile() to send to it.
 class TestServer
 {
 public:

@@ -23,6 +23,9 @@ void TestOrb::initTestCase()
     QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/top_usage.xml"), "<usage/>"));
     QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/notes.txt"), "x"));
     QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/top_usage.XML"), "<usage/>"));
+    // Nothing here may be sent: collection is off for the whole installation.
+    QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"),
+                                 "collectusagestatistics=false\n"));
 }
 
 void TestOrb::commandLine_data()
@@ -40,6 +43,10 @@ void TestOrb::commandLine_data()
         << QStringList{"open", "top_usage.xml"} << 0 << "Corvid: open " + m_work + "/top_usage.xml (design \"top\")";
     QTest::newRow("design from the open context")
         << QStringList{"open", "top_usage.xml", "--design", "blinker"} << 0 << "(design \"blinker\")";
+    QTest::newRow("collection off: nothing built")
+        << QStringList{"open", "top_usage.xml"} << 0 << "Corvid: collection is switched off";
+    QTest::newRow("folder that is gone")
+        << QStringList{"open", m_work + "/gone/top_usage.xml"} << 0 << "Corvid: cannot enter the folder";
     QTest::newRow("open without file") << QStringList{"open"} << 1 << "open needs a file name";
     QTest::newRow("unknown option") << QStringList{"--bogus"} << 1 << "unknown argument: --bogus";
 }
@@ -49,10 +56,13 @@ void TestOrb::commandLine()
     QFETCH(QStringList, arguments);
     QFETCH(QString, expectedOutput);
     QFETCH(int, exitCode);
-    const CorvidTest::ToolRun orb =
-        CorvidTest::runStaged(QStringLiteral("orb"), arguments, m_work, {QStringLiteral("ORB_DEBUG=1")});
+    // Should anything still try to send, it finds no server.
+    const CorvidTest::ToolRun orb = CorvidTest::runStaged(
+        QStringLiteral("orb"), arguments, m_work,
+        {QStringLiteral("ORB_DEBUG=1"), QStringLiteral("CORVID_SERVER=https://127.0.0.1:9")});
     QVERIFY2(orb.output.contains(expectedOutput), qPrintable(orb.output));
     QCOMPARE(orb.exitCode, exitCode);
+    QVERIFY(!QFile::exists(m_work + QLatin1String("/device_usage_statistics.html")));
 }
 
 QTEST_GUILESS_MAIN(TestOrb)

@@ -43,12 +43,10 @@ class Contributor : public QObject
     Q_OBJECT
 public:
     Creator creator;
-    int requests = 0;
 
 public Q_SLOTS:
     void onDataRequested(Gui::Clip::DataCollector &collector)
     {
-        ++requests;
         if (collector.getDesiredDataType() != DataCollector::PreferenceSheet || !collector.getPropSheet())
             return;
         auto *item = new PropItem(QStringLiteral("Corvid"), QStringLiteral("Corvid"),
@@ -65,7 +63,6 @@ class TestPropSheet : public QObject
     Q_OBJECT
 private Q_SLOTS:
     void pagesAreMadeOnFirstShowAndDriven();
-    void otherDataTypesAddNothing();
 };
 
 void TestPropSheet::pagesAreMadeOnFirstShowAndDriven()
@@ -95,20 +92,6 @@ void TestPropSheet::pagesAreMadeOnFirstShowAndDriven()
     QCOMPARE(page->events, (QList<int>{PropSheetEvent::ActivatePage, PropSheetEvent::ActivatePage,
                                        PropSheetEvent::ApplyChanges, PropSheetEvent::ApplyChanges}));
     QObject::disconnect(qApp, nullptr, &contributor, nullptr);
-}
-
-void TestPropSheet::otherDataTypesAddNothing()
-{
-    Contributor contributor;
-    QObject::connect(qApp, SIGNAL(dataRequested(Gui::Clip::DataCollector&)), &contributor,
-                     SLOT(onDataRequested(Gui::Clip::DataCollector&)));
-    PropSheet sheet;
-    DataCollector other(7, &sheet);
-    static_cast<ApplicationBase *>(qApp)->requestData(other);
-    DataCollector noSheet(DataCollector::PreferenceSheet, nullptr);
-    static_cast<ApplicationBase *>(qApp)->requestData(noSheet);
-    QCOMPARE(contributor.requests, 2);
-    QCOMPARE(sheet.itemCount(), 0);
 }
 
 int main(int argc, char **argv)

@@ -6,6 +6,10 @@
 #include "host/RefObject.h"
 #include "host/String.h"
 #include "host/gui/ApplicationBase.h"
+#include "host/gui/DataCollector.h"
+#include "host/gui/PropItem.h"
+#include "host/gui/PropSheet.h"
+#include "host/gui/VantorUpdatePage.h"
 #include "plugin/CollectionCycle.h"
 
 #include <QDir>
@@ -62,6 +66,7 @@ private Q_SLOTS:
     void instanceIsGuardedSingleton();
     void designName_data();
     void designName();
+    void preferenceSheet();
 
 private:
     std::unique_ptr<CorvidTest::Environment> m_env;
@@ -176,6 +181,32 @@ void TestCorvidPlugin::designName()
                  expected);
         QCOMPARE(QDir::currentPath(), m_env->home());
     }
+}
+
+void TestCorvidPlugin::preferenceSheet()
+{
+    // Edit > Preferences...: the host's own page, then what the plug-ins add.
+    QPluginLoader loader(pluginPath());
+    QVERIFY(loader.instance());
+    {
+        auto *app = static_cast<Gui::Clip::ApplicationBase *>(QCoreApplication::instance());
+        Gui::Clip::PropSheet sheet;
+        Gui::Clip::VantorUpdatePage::addTo(&sheet);
+        Gui::Clip::DataCollector other(1, &sheet);
+        app->requestData(other);
+        QCOMPARE(sheet.itemCount(), 1);
+        Gui::Clip::DataCollector preferences(Gui::Clip::DataCollector::PreferenceSheet, &sheet);
+        app->requestData(preferences);
+        QCOMPARE(sheet.itemCount(), 2);
+        QCOMPARE(sheet.item(0)->name(), QStringLiteral("VantorUpdate"));
+        QCOMPARE(sheet.item(1)->name(), QStringLiteral("Corvid"));
+        for (int i = 0; i < 2; ++i) {
+            sheet.showItem(i);
+            QVERIFY(sheet.item(i)->page());
+        }
+        QCOMPARE(sheet.item(1)->page()->objectName(), QStringLiteral("DataCollectionPage"));
+    }
+    QVERIFY(loader.unload());
 }
 
 int main(int argc, char **argv)

@@ -100,15 +100,24 @@ void TestOrbProject::createProject()
 {
     const QString file = m_work + QLatin1String("/fresh.orb");
     QString error;
+    const QDate day = QDate::currentDate();
     QVERIFY2(OrbProject::createProject(file, {QStringLiteral("Xc7"), QStringLiteral("xc7k70"),
                                               QStringLiteral("fbg676"), QStringLiteral("-1")},
                                        &error),
              qPrintable(error));
-    QCOMPARE(ProjectRepositoryValues::instance().projectAgeInDays(file), QStringLiteral("0"));
-    QString stamp;
-    QVERIFY(RepositoryAccess::read(file, QLatin1String(RepositoryAccess::CreationSection),
-                                   QLatin1String(RepositoryAccess::CreationSubSection),
-                                   QLatin1String(RepositoryAccess::CreationKey), &stamp));
+    // Made today, or yesterday when midnight passed meanwhile.
+    const QString age = ProjectRepositoryValues::instance().projectAgeInDays(file);
+    QVERIFY2(age == QLatin1String("0")
+                 || (age == QLatin1String("1") && QDate::currentDate() != day),
+             qPrintable(age));
+    const auto creationStamp = [&file] {
+        QString stamp;
+        RepositoryAccess::read(file, QLatin1String(RepositoryAccess::CreationSection),
+                               QLatin1String(RepositoryAccess::CreationSubSection),
+                               QLatin1String(RepositoryAccess::CreationKey), &stamp);
+        return stamp;
+    };
+    const QString stamp = creationStamp();
     QVERIFY2(QDateTime::fromString(stamp, Qt::ISODate).isValid(), qPrintable(stamp));
 
     // A second creation is refused and changes nothing.
@@ -119,11 +128,7 @@ void TestOrbProject::createProject()
 
     // Initialising again keeps the creation time.
     QVERIFY(OrbProject::initializeRepository(file, &error));
-    QString again;
-    QVERIFY(RepositoryAccess::read(file, QLatin1String(RepositoryAccess::CreationSection),
-                                   QLatin1String(RepositoryAccess::CreationSubSection),
-                                   QLatin1String(RepositoryAccess::CreationKey), &again));
-    QCOMPARE(again, stamp);
+    QCOMPARE(creationStamp(), stamp);
 
     QVERIFY(OrbProject::openCurrentProject(file));
     QCOMPARE(OrbProject::currentProjectName(), QStringLiteral("fresh"));
@@ -139,8 +144,6 @@ void TestOrbProject::commandLine_data()
     QTest::addColumn<QString>("expectedOutput"); // in stdout or stderr
     QTest::addColumn<QStringList>("filesAfter");  // in the work directory
 
-    QTest::newRow("help names the project commands")
-        << QStringList{"--help"} << 0 << "new-project FILE.orb" << QStringList{"broken.orb"};
     QTest::newRow("missing project file")
         << QStringList{"--project", "absent.orb", "open", "top_usage.xml"} << 1
         << "orb: absent.orb: no such project file" << QStringList{"broken.orb"};

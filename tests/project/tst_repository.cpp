@@ -1,9 +1,6 @@
 #include "common/TestEnvironment.h"
 
-#include "host/AutoRelease.h"
 #include "host/Factory.h"
-#include "host/Repository.h"
-#include "host/String.h"
 #include "host/project/RepositoryAccess.h"
 #include "project/ProjectRepositoryValues.h"
 
@@ -11,11 +8,9 @@
 #include <QSqlDatabase>
 #include <QtTest>
 
-using Gui::Clip::String;
-
-// The project repository component (libPrjrep_Repository) as its clients see
-// it: open modes and statuses, the file beside the project, and several
-// processes using one repository.
+// The project repository component (libPrjrep_Repository) as Corvid reaches
+// it: reads and writes, the file beside the project, a damaged file, and
+// several processes writing one repository.
 class TestRepository : public QObject
 {
     Q_OBJECT
@@ -27,7 +22,6 @@ private Q_SLOTS:
     void damagedRepository_data();
     void damagedRepository();
     void connectionsAreRemoved();
-    void valuesSurviveTheProcess();
     void concurrentWritersLoseNothing();
 
 private:
@@ -38,69 +32,11 @@ private:
 
 namespace {
 
-// One open repository object with a section and a sub-section, released in
-// order at the end.
-class Session
-{
-public:
-    Session() : m_object(CitP::Factory::CreateInstance(Prjrep::IRepository::objectId()))
-    {
-        m_repository = m_object ? static_cast<Prjrep::IRepository *>(
-                                      m_object->GetInterface(Prjrep::IRepository::iid()))
-                                : nullptr;
-    }
-    ~Session()
-    {
-        if (m_section && m_sub)
-            m_section->releaseSubSection(m_sub);
-        if (m_repository)
-            m_repository->close();
-    }
-
-    bool valid() const { return m_repository != nullptr; }
-
-    int openSection(const QString &project, const char *name, int mode)
-    {
-        CitI::IInterface *object = nullptr;
-        const int status = m_repository->openSection(String::convert(project), name, mode, &object);
-        m_section = object ? static_cast<Prjrep::IRegSection *>(
-                                 object->GetInterface(Prjrep::IRegSection::iid()))
-                           : nullptr;
-        if ((status == Prjrep::StatusOk) != (m_section != nullptr))
-            return -99; // success must come with an object, failure without
-        return status;
-    }
-    int openSub(const char *name, int mode)
-    {
-        const int status = m_section->openSubSection(name, mode, &m_sub);
-        if ((status == Prjrep::StatusOk) != (m_sub != nullptr))
-            return -99;
-        return status;
-    }
-    Prjrep::IRegSection *section() const { return m_section; }
-    Prjrep::IRegSection *sub() const { return m_sub; }
-
-private:
-    Prjrep::AutoRelease<CitI::IInterface> m_object;
-    Prjrep::IRepository *m_repository = nullptr;
-    Prjrep::IRegSection *m_section = nullptr;
-    Prjrep::IRegSection *m_sub = nullptr;
-};
-
 QString repositoryFile(const QString &project)
 {
     QString name = project;
     name.chop(4); // ".orb"
     return name + QLatin1String(".orbrepo");
-}
-
-QByteArray runTool(const QStringList &arguments)
-{
-    QProcess tool;
-    tool.start(QStringLiteral(REPOTOOL), arguments);
-    if (!tool.waitForFinished(60000) || tool.exitCode() != 0)
-        return "<failed: " + tool.readAllStandardError() + '>';
-    return tool.readAllStandardOutput().trimmed();
 }
 
 } // namespace
@@ -123,33 +59,22 @@ QString TestRepository::newProject(const QString &name)
 void TestRepository::modes_data()
 {
     QTest::addColumn<bool>("projectExists");
-    QTest::addColumn<bool>("prepared"); // a value was stored before
-    QTest::addColumn<int>("sectionMode");
-    QTest::addColumn<int>("subMode");
-    QTest::addColumn<int>("sectionStatus");
-    QTest::addColumn<int>("subStatus");   // -1: not reached (the section failed)
-    QTest::addColumn<int>("writeStatus"); // -1: not reached
+    QTest::addColumn<bool>("prepared"); // "k" was stored before
+    QTest::addColumn<bool>("write");    // else read
+    QTest::addColumn<QString>("outcome"); // the value read afterwards; "-": the call failed
     QTest::addColumn<bool>("repositoryExists");
 
-    const int rw = Prjrep::ModeReadWriteCreate, ro = Prjrep::ModeReadOnly;
-    QTest::newRow("43 creates the repository") << true << false << rw << rw << 1 << 1 << 1 << true;
-    QTest::newRow("1 needs an existing repository") << true << false << ro << ro << 2 << -1 << -1 << false;
-    QTest::newRow("project file missing") << false << false << rw << rw << 2 << -1 << -1 << false;
-    QTest::newRow("1 on a stored value") << true << true << ro << ro << 1 << 1 << 3 << true;
-    QTest::newRow("writable sub-section of a read-only section")
-        << true << true << ro << rw << 1 << 3 << -1 << true;
-    QTest::newRow("no access at all") << true << false << 0 << 0 << 3 << -1 << -1 << false;
+    QTest::newRow("writing creates the repository") << true << false << true << "w" << true;
+    QTest::newRow("reading creates nothing") << true << false << false << "-" << false;
+    QTest::newRow("reading a stored value") << true << true << false << "v" << true;
+    QTest::newRow("no repository without a project file") << false << false << true << "-" << false;
 }
 
 void TestRepository::modes()
 {
     QFETCH(bool, projectExists);
     QFETCH(bool, prepared);
-    QFETCH(int, sectionMode);
-    QFETCH(int, subMode);
-    QFETCH(int, sectionStatus);
-    QFETCH(int, subStatus);
-    QFETCH(int, writeStatus);
+    QFETCH(bool, write);
     QFETCH(bool, repositoryExists);
 
     const QString project = newProject(QStringLiteral("modes"));
@@ -157,51 +82,39 @@ void TestRepository::modes()
         QFile::remove(project);
     if (prepared)
         QVERIFY(RepositoryAccess::write(project, "S", "Sub", "k", "v"));
-
-    Session session;
-    QVERIFY(session.valid());
-    QCOMPARE(session.openSection(project, "S", sectionMode), sectionStatus);
-    if (sectionStatus == 1) {
-        QCOMPARE(session.openSub("Sub", subMode), subStatus);
-        if (session.sub()) {
-            QCOMPARE(session.sub()->setValue("k", "w"), writeStatus);
-            Port::StringBase value;
-            QCOMPARE(session.sub()->getValue("k", value), 1);
-            QCOMPARE(value.str(), std::string(writeStatus == 1 ? "w" : "v"));
-        }
-    }
+    QString value;
+    const bool done = write ? RepositoryAccess::write(project, "S", "Sub", "k", "w")
+                            : RepositoryAccess::read(project, "S", "Sub", "k", &value);
+    if (done && write)
+        QVERIFY(RepositoryAccess::read(project, "S", "Sub", "k", &value));
+    QTEST(done ? value : QStringLiteral("-"), "outcome");
     QCOMPARE(QFileInfo::exists(repositoryFile(project)), repositoryExists);
 }
 
 void TestRepository::values()
 {
     const QString project = newProject(QStringLiteral("values"));
-    {
-        Session session;
-        QCOMPARE(session.openSection(project, "Corvid", Prjrep::ModeReadWriteCreate), 1);
-        QCOMPARE(session.openSub("DesignDataCollection", Prjrep::ModeReadWriteCreate), 1);
-        Prjrep::IRegSection *sub = session.sub();
-        QCOMPARE(sub->getName().str(), std::string("DesignDataCollection"));
-        QCOMPARE(sub->setValue("text", "Grüße \"quoted\" 'x'; DROP TABLE entries;"), 1);
-        QCOMPARE(sub->setValue("empty", ""), 1);
-        QCOMPARE(sub->setValue("twice", "first"), 1);
-        QCOMPARE(sub->setValue("twice", "second"), 1);
-        QCOMPARE(sub->setValue("", "no key"), 0);
-    }
-    // Values are kept per sub-section and read back in a new session.
-    QVERIFY(RepositoryAccess::write(project, "Corvid", "Other", "twice", "elsewhere"));
-    Session session;
-    QCOMPARE(session.openSection(project, "Corvid", Prjrep::ModeReadOnly), 1);
-    QCOMPARE(session.openSub("DesignDataCollection", Prjrep::ModeReadOnly), 1);
-    Port::StringBase value;
-    QCOMPARE(session.sub()->getValue("text", value), 1);
-    QCOMPARE(String::convert(value), QStringLiteral("Grüße \"quoted\" 'x'; DROP TABLE entries;"));
-    QCOMPARE(session.sub()->getValue("empty", value), 1);
-    QCOMPARE(value.str(), std::string());
-    QCOMPARE(session.sub()->getValue("twice", value), 1);
-    QCOMPARE(value.str(), std::string("second"));
-    QCOMPARE(session.sub()->getValue("never", value), int(Prjrep::StatusNotFound));
-    QVERIFY(value.IsEmpty());
+    const QString tricky = QStringLiteral("Grüße \"quoted\" 'x'; DROP TABLE entries;");
+    const auto write = [&](const char *sub, const char *key, const QString &value) {
+        return RepositoryAccess::write(project, "Corvid", QLatin1String(sub), QLatin1String(key), value);
+    };
+    QVERIFY(write("DesignDataCollection", "text", tricky));
+    QVERIFY(write("DesignDataCollection", "empty", QString()));
+    QVERIFY(write("DesignDataCollection", "twice", "first"));
+    QVERIFY(write("DesignDataCollection", "twice", "second"));
+    QVERIFY(!write("DesignDataCollection", "", "no key"));
+    QVERIFY(write("Other", "twice", "elsewhere")); // values are kept per sub-section
+
+    const auto read = [&](const char *key) {
+        QString value = QStringLiteral("stale");
+        const bool found = RepositoryAccess::read(project, "Corvid", "DesignDataCollection",
+                                                  QLatin1String(key), &value);
+        return found ? value : QStringLiteral("<none: %1>").arg(value);
+    };
+    QCOMPARE(read("text"), tricky);
+    QCOMPARE(read("empty"), QString());
+    QCOMPARE(read("twice"), QStringLiteral("second"));
+    QCOMPARE(read("never"), QStringLiteral("<none: >"));
 }
 
 void TestRepository::damagedRepository_data()
@@ -237,25 +150,6 @@ void TestRepository::connectionsAreRemoved()
         QCOMPARE(values.getValue(project, QStringLiteral("k")), QString::number(i));
     }
     QCOMPARE(QSqlDatabase::connectionNames(), QStringList());
-}
-
-void TestRepository::valuesSurviveTheProcess()
-{
-    const QString project = newProject(QStringLiteral("restart"));
-    QCOMPARE(runTool({QStringLiteral("set"), project, QStringLiteral("Corvid-DataCollection-Project-ID"),
-                      QStringLiteral("0123456789abcdef0123456789abcdef")}),
-             QByteArray());
-    QCOMPARE(runTool({QStringLiteral("get"), project, QStringLiteral("Corvid-DataCollection-Project-ID")}),
-             QByteArray("0123456789abcdef0123456789abcdef"));
-
-    // A project created by orb carries its creation time: made today.
-    const QString created = m_env->home() + QLatin1String("/created/led.orb");
-    QDir().mkpath(QFileInfo(created).absolutePath());
-    QCOMPARE(CorvidTest::runStaged(QStringLiteral("orb"), {QStringLiteral("new-project"), created},
-                                   m_env->home())
-                 .exitCode,
-             0);
-    QCOMPARE(runTool({QStringLiteral("age"), created}), QByteArray("0"));
 }
 
 void TestRepository::concurrentWritersLoseNothing()

@@ -2,12 +2,13 @@
 
 #include "report/CommandLog.h"
 
-#include <QDir>
 #include <QRandomGenerator>
 #include <QRegularExpression>
 #include <QTemporaryDir>
 #include <QtTest>
 
+// The sample page shows a whole log made anonymous and its table; here the
+// rules it does not reach, and lines made to be slow or odd.
 class tst_CommandLog : public QObject
 {
     Q_OBJECT
@@ -19,9 +20,7 @@ private Q_SLOTS:
     void sameAsThePatterns();
     void readCommandLog_data();
     void readCommandLog();
-    void unreadableLogs();
-    void fuseLog();
-    void section();
+    void fuseLogAlone();
     void pathologicalLines();
 
 private:
@@ -43,30 +42,9 @@ void tst_CommandLog::anonymized_data()
     QTest::addColumn<QString>("design");
     QTest::addColumn<QString>("expected");
 
-    QTest::newRow("quoted paths, first to last quote")
-        << "synth -ifn \"C:/proj/top.prj\" -ofn \"C:/proj/top.snx\"" << "top"
-        << "synth -ifn <orb_file>";
-    QTest::newRow("several quotes on one line")
-        << "a \"x\" b \"y\" c \"z\" d" << "top" << "a <orb_file> d";
-    QTest::newRow("single quote left alone") << "echo \"C:/proj" << "top" << "echo \"C:/proj";
-    QTest::newRow("file names keep their extension")
-        << "map -o top_map.out top.in" << "top" << "map -o <fname>.out <fname>.in";
-    QTest::newRow("runs of white space") << "  par \t  -w  top  " << "top" << "par -w <design>";
-    QTest::newRow("design inside a word") << "view topmost" << "top" << "view <design>most";
     QTest::newRow("design case-sensitive") << "TOP Top top" << "top" << "TOP Top <design>";
     QTest::newRow("design before a dot is swallowed")
         << "bitmake top.ncd" << "top" << "bitmake <fname>.ncd";
-    QTest::newRow("up to the last dot") << "cp a.b.c.d x" << "top" << "cp <fname>.d x";
-    QTest::newRow("trailing dot") << "open a.b." << "top" << "open <fname>.";
-    QTest::newRow("two dots") << "cd .." << "top" << "cd <fname>.";
-    QTest::newRow("leading dot only") << "ls .hidden" << "top" << "ls .hidden";
-    QTest::newRow("dot inside a quote") << "run -f x\"a.b\"y.z" << "top" << "run -f <fname>.z";
-    QTest::newRow("redirection kept") << "timing top.ncd > t.txt" << "top"
-                                      << "timing <fname>.ncd > <fname>.txt";
-    QTest::newRow("no-break space is white space")
-        << QString::fromUtf8("par\xc2\xa0-w") << "top" << "par -w";
-    QTest::newRow("empty line") << "" << "top" << "";
-    QTest::newRow("blank line") << " \t " << "top" << "";
     QTest::newRow("empty design replaces nothing") << "par top" << "" << "par top";
 }
 
@@ -104,17 +82,10 @@ void tst_CommandLog::readCommandLog_data()
     QTest::addColumn<QByteArray>("contents");
     QTest::addColumn<QStringList>("expected");
 
-    QTest::newRow("design from the file name")
-        << "top.cmd_log" << QByteArray("par -w top\nsynth -ifn \"top.prj\"\n")
-        << QStringList{"par -w <design>", "synth -ifn <orb_file>"};
     QTest::newRow("design up to the first dot")
         << "top.v2.cmd_log" << QByteArray("par top.v2") << QStringList{"par <fname>.v2"};
-    QTest::newRow("empty lines kept")
-        << "top.cmd_log" << QByteArray("a\n\nb\n") << QStringList{"a", "", "b"};
     QTest::newRow("CRLF line ends") << "top.cmd_log" << QByteArray("a top\r\nb\r\n")
                                     << QStringList{"a <design>", "b"};
-    QTest::newRow("UTF-8") << "top.cmd_log" << QByteArray("echo gr\xc3\xbc\xc3\x9f top")
-                           << QStringList{QString::fromUtf8("echo gr\xc3\xbc\xc3\x9f <design>")};
     QTest::newRow("empty file") << "top.cmd_log" << QByteArray() << QStringList();
     QTest::newRow("binary bytes") << "top.cmd_log" << QByteArray("\x01\x00\xff top", 7)
                                   << QStringList{QString(QChar(1)) + QChar(0) + QChar(QChar::ReplacementCharacter)
@@ -135,51 +106,16 @@ void tst_CommandLog::readCommandLog()
     QFile::remove(path(fileName));
 }
 
-void tst_CommandLog::unreadableLogs()
-{
-    CrvC_ReportData data;
-    QVERIFY(!CrvC_CommandLog::readCommandLog(path("missing.cmd_log"), data));
-    QVERIFY(QDir().mkpath(path("folder.cmd_log")));
-    QVERIFY(!CrvC_CommandLog::readCommandLog(path("folder.cmd_log"), data));
-    QVERIFY(data.commandHistory.isEmpty());
-}
-
-void tst_CommandLog::fuseLog()
+// Without a command log the table holds "fuse" alone; without fuse.log nothing.
+void tst_CommandLog::fuseLogAlone()
 {
     const QString fuse = path("fuse/fuse.log");
     CrvC_ReportData data;
     QVERIFY(!CrvC_CommandLog::checkFuseLog(fuse, data));
-    QVERIFY(data.commandHistory.isEmpty());
-
-    // Present, even empty: one entry after the command log's.
     QVERIFY(CorvidTest::writeFile(fuse, QByteArray()));
-    QVERIFY(CorvidTest::writeFile(path("fuse/top.cmd_log"), "par top\n"));
-    QVERIFY(CrvC_CommandLog::readCommandLog(path("fuse/top.cmd_log"), data));
+    QVERIFY(!CrvC_CommandLog::readCommandLog(path("fuse/none.cmd_log"), data));
     QVERIFY(CrvC_CommandLog::checkFuseLog(fuse, data));
-    QCOMPARE(data.commandHistory, (QStringList{"par <design>", "fuse"}));
-
-    // Without a command log the table holds "fuse" alone.
-    CrvC_ReportData fuseOnly;
-    QVERIFY(!CrvC_CommandLog::readCommandLog(path("fuse/none.cmd_log"), fuseOnly));
-    QVERIFY(CrvC_CommandLog::checkFuseLog(fuse, fuseOnly));
-    QCOMPARE(fuseOnly.commandHistory, QStringList{"fuse"});
-}
-
-void tst_CommandLog::section()
-{
-    CrvC_ReportData data;
-    data.commandHistory << "synth -ifn <orb_file>" << "" << "a && b \"c\" 'd' >> <<";
-    QCOMPARE(CrvC_CommandLog::commandLineHistorySection(data),
-             QStringLiteral(
-                 "&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
-                 "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD><B>Tool Usage</B></TD></TR>\n"
-                 "<TR VALIGN=TOP><TD ALIGN=LEFT>Command Line History"
-                 "<dtag-section name=\"CommandLineLog\"><UL>\n"
-                 "<LI><dtag-cmdline>synth -ifn &lt;orb_file&gt;</dtag-cmdline></LI>\n"
-                 "<LI><dtag-cmdline></dtag-cmdline></LI>\n"
-                 "<LI><dtag-cmdline>a && b \"c\" 'd' &gt;&gt; &lt;&lt;</dtag-cmdline></LI>\n"
-                 "</dtag-section></UL></TD></TR>\n"
-                 "</TABLE>"));
+    QCOMPARE(data.commandHistory, QStringList{"fuse"});
 }
 
 // Lines made to provoke backtracking: a scan that is quadratic in the

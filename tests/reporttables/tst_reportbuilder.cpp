@@ -1,11 +1,12 @@
 #include "common/TestEnvironment.h"
 #include "project/CorvidSettings.h"
 #include "report/ReportBuilder.h"
-#include "report/VersionSection.h"
 
 #include <QDir>
 #include <QTemporaryDir>
 #include <QtTest>
+
+#include <new>
 
 namespace {
 
@@ -25,6 +26,10 @@ const QString EmptyDeviceTable = QStringLiteral(
     "<TR VALIGN=TOP>\n"
     "<TD>&nbsp;</TD>\n<TD>&nbsp;</TD><TD>&nbsp;</TD>\n<TD>&nbsp;</TD>\n</TR></TABLE>\n");
 
+const QString VersionTableStart = QStringLiteral(
+    "<TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
+    "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN='4'><B>Software Version and Target Device");
+
 CrvC_ReportBuilder::Environment environment(int *asked = nullptr, bool answer = false,
                                             const QString &typed = QString(),
                                             QStringList *busy = nullptr)
@@ -32,6 +37,7 @@ CrvC_ReportBuilder::Environment environment(int *asked = nullptr, bool answer = 
     CrvC_ReportBuilder::Environment env;
     env.now = [] { return QDateTime(QDate(2009, 3, 17), QTime(14, 5, 9)); };
     env.newIdentifier = [] { return QStringLiteral("0123456789abcdef0123456789abcdef"); };
+    env.randomId = [] { return QStringLiteral("5eed5eed5eed5eed5eed5eed5eed5eed"); };
     env.askDesignName = [asked, answer, typed](QString &name) {
         if (asked)
             ++*asked;
@@ -135,20 +141,108 @@ private Q_SLOTS:
         builder.createReport(QStringLiteral("top"), QStringLiteral("top"), QStringLiteral("Xc6"));
         QCOMPARE(busy, QStringList({"busy", "idle"}));
 
-        CrvC_ReportData copy = builder.data();
-        const QString expected = PageHead
-            + CrvC_VersionSection::versionSection(copy, builder.environment())
-            + QLatin1Char('\n') + EmptyDeviceTable;
         const QString page = builder.pageText();
-        QCOMPARE(page.left(expected.size()), expected);
+        QVERIFY(page.startsWith(PageHead + VersionTableStart));
+        QVERIFY(page.contains(QLatin1String("</TR>\n</TABLE>\n") + EmptyDeviceTable));
+        QVERIFY(page.contains(QLatin1String("<dtag-property name=\"RandomID\">"
+                                            "5eed5eed5eed5eed5eed5eed5eed5eed</dtag-property>")));
         QVERIFY(!page.contains(QLatin1String("Configuration Data")));
         QVERIFY(!page.contains(QLatin1String("Pin Data")));
         QVERIFY(page.endsWith(QLatin1String("\n</BODY></HTML>")));
 
         QVERIFY(builder.written());
-        QCOMPARE(QDir::current().absoluteFilePath(builder.data().reportPath),
+        QVERIFY(!builder.pageCut());
+        QCOMPARE(QDir::current().absoluteFilePath(builder.reportPath()),
                  m_dir->filePath(QStringLiteral("device_usage_statistics.html")));
-        QCOMPARE(CorvidTest::readFile(builder.data().reportPath), page.toUtf8());
+        QCOMPARE(CorvidTest::readFile(builder.reportPath()), page.toUtf8());
+    }
+
+    // A page larger than the review shows goes whole to the file; the
+    // builder keeps its beginning.
+    void largePageKeepsBeginning()
+    {
+        QByteArray xml = "<DeviceUsageReport><DeviceUsage>\n";
+        const qsizetype items = CrvC_ReportBuilder::PageTextLimit / 40 + 1000;
+        for (qsizetype i = 0; i < items; ++i) {
+            if (i % 50 == 0)
+                xml += (i ? "</group>\n" : "") + QByteArray("<group name=\"G")
+                       + QByteArray::number(i) + "\">\n";
+            xml += "<item name=\"Sl\xc3\xaf" "ce\" value=\"" + QByteArray::number(i) + "\"/>\n";
+        }
+        xml += "</group></DeviceUsage></DeviceUsageReport>\n";
+        QVERIFY(CorvidTest::writeFile(QStringLiteral("top_usage.xml"), xml));
+
+        CrvC_ReportBuilder builder(environment());
+        builder.createReport(QStringLiteral("top"), QStringLiteral("top"), QString());
+        QVERIFY(builder.written());
+        QVERIFY(builder.pageCut());
+        QCOMPARE(builder.pageText().size(), CrvC_ReportBuilder::PageTextLimit);
+        const QString file = QString::fromUtf8(CorvidTest::readFile(builder.reportPath()));
+        QVERIFY(file.size() > CrvC_ReportBuilder::PageTextLimit);
+        QVERIFY(file.startsWith(builder.pageText()));
+        QVERIFY(file.contains(QStringLiteral("Sl\u00efce=") + QString::number(items - 1)));
+        QVERIFY(file.endsWith(QLatin1String("\n</BODY></HTML>")));
+    }
+
+    // The page is written whole or not at all: the previous file, or the
+    // file a link points to, stays as it was, and the cursor comes back.
+    void pageNotWritten_data()
+    {
+        QTest::addColumn<QString>("how");
+        QTest::newRow("report path is a symbolic link") << "link";
+        QTest::newRow("folder of the report path missing") << "missing";
+        QTest::newRow("memory runs out") << "memory";
+    }
+
+    void pageNotWritten()
+    {
+        QFETCH(QString, how);
+        const QByteArray old = "previous page";
+        QVERIFY(CorvidTest::writeFile(QStringLiteral("target.html"), old));
+        QStringList busy;
+        CrvC_ReportBuilder::Environment env = environment(nullptr, false, QString(), &busy);
+        if (how == QLatin1String("memory"))
+            env.now = []() -> QDateTime { throw std::bad_alloc(); };
+        CrvC_ReportBuilder builder(env);
+        if (how == QLatin1String("link")) {
+            QVERIFY(QFile::link(QStringLiteral("target.html"), builder.reportPath()));
+        } else if (how == QLatin1String("missing")) {
+            builder.setReportPath(QStringLiteral("gone/device_usage_statistics.html"));
+        } else {
+            builder.setReportPath(QStringLiteral("target.html"));
+        }
+
+        builder.createReport(QStringLiteral("top"), QStringLiteral("top"), QString());
+        QVERIFY(!builder.written());
+        QCOMPARE(busy, QStringList({"busy", "idle"}));
+        QCOMPARE(CorvidTest::readFile(QStringLiteral("target.html")), old);
+        if (how == QLatin1String("link"))
+            QVERIFY(QFileInfo(builder.reportPath()).isSymLink());
+        QCOMPARE(QDir::current().entryList(QDir::Files | QDir::Hidden).size(),
+                 how == QLatin1String("link") ? 2 : 1); // no temporary file left
+    }
+
+    // Files named after the project are read only when there is one: without
+    // it nothing named ".orb..." in the working directory is opened.
+    void projectNamedInputs_data()
+    {
+        QTest::addColumn<QString>("projectFileArg");
+        QTest::addColumn<QString>("runsFile");
+        QTest::addColumn<bool>("runStatistics");
+        QTest::newRow("project file given") << "top" << "top.orb.runs" << true;
+        QTest::newRow("no project file") << "" << ".orb.runs" << false;
+    }
+
+    void projectNamedInputs()
+    {
+        QFETCH(QString, projectFileArg);
+        QFETCH(QString, runsFile);
+        QVERIFY(CorvidTest::writeFile(runsFile, "synth 2025-03-03T09:12:40 41 completed\n"));
+        CrvC_ReportBuilder builder(environment());
+        builder.createReport(projectFileArg, QStringLiteral("top"), QString());
+        QCOMPARE(builder.data().projectFile, projectFileArg + QLatin1String(".orb"));
+        QTEST(builder.pageText().contains(QLatin1String("<dtag-section name=\"RunStatistics\">")),
+              "runStatistics");
     }
 };
 

@@ -87,7 +87,6 @@ private Q_SLOTS:
         m_server.files.insert("/throws.pac", "function FindProxyForURL(url, host) { throw 'no'; }");
         m_server.files.insert("/syntax.pac", "function FindProxyForURL(url, host) { return \"PROXY");
         m_server.files.insert("/binary.pac", QByteArray("\x7f" "ELF\0\0\xff\xfe", 8));
-        m_server.files.insert("/empty.pac", "");
         m_server.start();
         m_server.ready.acquire();
         QVERIFY(m_server.port != 0);
@@ -110,7 +109,6 @@ private Q_SLOTS:
         QTest::newRow("throws") << "/throws.pac" << "www.vantor.example" << "";
         QTest::newRow("syntax error") << "/syntax.pac" << "www.vantor.example" << "";
         QTest::newRow("binary") << "/binary.pac" << "www.vantor.example" << "";
-        QTest::newRow("empty") << "/empty.pac" << "www.vantor.example" << "";
         QTest::newRow("not found") << "/missing.pac" << "www.vantor.example" << "";
     }
 

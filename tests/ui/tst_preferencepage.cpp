@@ -10,25 +10,6 @@
 
 #include <QtTest>
 
-// Corvid's preference page: which requests add the item, when the page is
-// made, and what the page shows and stores through the sheet's events.
-class TestPreferencePage : public QObject
-{
-    Q_OBJECT
-private Q_SLOTS:
-    void initTestCase();
-    void init() { m_env->clearSettings(); }
-    void request_data();
-    void request();
-    void pageOnlyForCorvidItem();
-    void loadAndApply_data();
-    void loadAndApply();
-    void applyKeepsLatestChoice();
-
-private:
-    std::unique_ptr<CorvidTest::Environment> m_env;
-};
-
 using CorvidTest::store;
 using CorvidTest::stored;
 using Gui::Clip::PropSheetEvent;
@@ -45,150 +26,123 @@ CrvC_DataCollectionPropPageImpl *showCorvidPage(Gui::Clip::PropSheet &sheet)
 
 } // namespace
 
-void TestPreferencePage::initTestCase()
+// Corvid's preference page: what it shows and stores through the sheet's
+// events.
+class TestPreferencePage : public QObject
 {
-    m_env.reset(new CorvidTest::Environment);
-    // Two mail programs on the path, so that the page has a list to show.
-    const QString bin = m_env->home() + QLatin1String("/bin");
-    QVERIFY(CorvidTest::writeFile(bin + QLatin1String("/mozilla"), "#!/bin/sh\n"));
-    QVERIFY(CorvidTest::writeFile(bin + QLatin1String("/thunderbird"), "#!/bin/sh\n"));
-    qputenv("PATH", QFile::encodeName(bin) + ':' + qgetenv("PATH"));
-}
+    Q_OBJECT
+    std::unique_ptr<CorvidTest::Environment> m_env;
 
-void TestPreferencePage::request_data()
-{
-    QTest::addColumn<int>("type");
-    QTest::addColumn<bool>("withSheet");
-    QTest::addColumn<int>("items");
+private Q_SLOTS:
+    void initTestCase()
+    {
+        m_env.reset(new CorvidTest::Environment);
+        // Two mail programs on the path, so that the page has a list to show.
+        const QString bin = m_env->home() + QLatin1String("/bin");
+        QVERIFY(CorvidTest::writeFile(bin + QLatin1String("/mozilla"), "#!/bin/sh\n"));
+        QVERIFY(CorvidTest::writeFile(bin + QLatin1String("/thunderbird"), "#!/bin/sh\n"));
+        qputenv("PATH", QFile::encodeName(bin) + ':' + qgetenv("PATH"));
+    }
+    void init() { m_env->clearSettings(); }
 
-    QTest::newRow("preference sheet") << 32 << true << 1;
-    QTest::newRow("type 32 without a sheet") << 32 << false << 0;
-    QTest::newRow("type 0") << 0 << true << 0;
-    QTest::newRow("type 33") << 33 << true << 0;
-}
+    void pagePerSheet()
+    {
+        // A preference request without a sheet adds nothing; every sheet gets
+        // a page of its own. (The item in the host's sheet: the plug-in's test.)
+        Gui::Clip::DataCollector noSheet(Gui::Clip::DataCollector::PreferenceSheet, nullptr);
+        CrvC_PropPageCreator::addPreferenceItem(noSheet);
+        Gui::Clip::PropSheet first, second;
+        CrvC_DataCollectionPropPageImpl *page = showCorvidPage(first);
+        QVERIFY(page && page != showCorvidPage(second));
+        QCOMPARE(first.itemCount(), 1);
+    }
 
-void TestPreferencePage::request()
-{
-    QFETCH(int, type);
-    QFETCH(bool, withSheet);
-    Gui::Clip::PropSheet sheet;
-    Gui::Clip::DataCollector collector(type, withSheet ? &sheet : nullptr);
-    CrvC_PropPageCreator::addPreferenceItem(collector);
-    QTEST(sheet.itemCount(), "items");
-    if (sheet.itemCount() == 0)
-        return;
-    QCOMPARE(sheet.item(0)->name(), QStringLiteral("Corvid"));
-    QVERIFY(!sheet.item(0)->page());
+    void loadAndApply_data()
+    {
+        QTest::addColumn<QVariant>("useSsl");
+        QTest::addColumn<QByteArray>("installFile");
+        QTest::addColumn<bool>("switchMethod");
+        QTest::addColumn<bool>("collectShown");
+        QTest::addColumn<QVariant>("useSslAfter"); // invalid: not written
+        QTest::addColumn<bool>("savedTool");       // the second program is remembered
 
-    // Every sheet gets an item and a page of its own.
-    Gui::Clip::PropSheet second;
-    sheet.showItem(0);
-    auto *page = qobject_cast<CrvC_DataCollectionPropPageImpl *>(sheet.item(0)->page());
-    QVERIFY(page && page != showCorvidPage(second));
-    QCOMPARE(page->objectName(), QStringLiteral("DataCollectionPage"));
-}
+        const QVariant none;
+        QTest::newRow("defaults, unchanged") << none << QByteArray() << false << true << none << false;
+        QTest::newRow("installation switched off")
+            << none << QByteArray("collectusagestatistics=false\n") << false << false << none << false;
+        QTest::newRow("upload to e-mail") << QVariant(true) << QByteArray() << true << true << QVariant(false) << false;
+        QTest::newRow("program remembered") << QVariant(false) << QByteArray() << false << true << QVariant(false) << true;
+    }
 
-void TestPreferencePage::pageOnlyForCorvidItem()
-{
-    Gui::Clip::PropSheet sheet;
-    CrvC_PropPageCreator creator;
-    auto *other = new Gui::Clip::PropItem(QStringLiteral("Editor"), QStringLiteral("Editor"), QString(), "other");
-    other->setPropPageCreator(&creator, SLOT(OnCreatePrefPage(QWidget*,PropItem*)));
-    sheet.addItem(other, false, 1);
-    QWidget container;
-    QVERIFY(!other->createPage(&container));
+    void loadAndApply()
+    {
+        QFETCH(QVariant, useSsl);
+        QFETCH(QByteArray, installFile);
+        QFETCH(bool, switchMethod);
+        QFETCH(bool, collectShown);
+        QFETCH(bool, savedTool);
+        store(CrvC_Settings::UseSSL, useSsl);
+        const QStringList tools = CrvC_DataCollectionEmail().emailTools();
+        QVERIFY(tools.size() >= 2);
+        if (savedTool)
+            store(CrvC_Settings::SelectedEmailTool, tools.at(1));
+        QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), installFile));
 
-    // An item of no sheet gets no page either.
-    Gui::Clip::PropItem loose(QStringLiteral("Corvid"), QStringLiteral("Corvid"), QString(), "loose");
-    loose.setPropPageCreator(&creator, SLOT(OnCreatePrefPage(QWidget*,PropItem*)));
-    QVERIFY(!loose.createPage(&container));
-}
+        Gui::Clip::PropSheet sheet;
+        CrvC_DataCollectionPropPageImpl *page = showCorvidPage(sheet);
+        QVERIFY(page);
+        const bool ssl = useSsl.isValid() ? useSsl.toBool() : true;
+        QCOMPARE(page->collectionCheckBox->isChecked(), collectShown);
+        QCOMPARE(page->sslRadioButton->isChecked(), ssl);
+        QCOMPARE(page->emailRadioButton->isChecked(), !ssl);
+        QCOMPARE(page->selectEmailTool->isEnabled(), !ssl);
+        QVERIFY(!page->selectEmailTool->isEditable());
+        // The list as the e-mail sender offers it, the preferred program last and current.
+        const QStringList offered = CrvC_PreferenceValues::mailListOrder(page->emailToolNames());
+        QCOMPARE(page->selectEmailTool->count(), offered.size());
+        QCOMPARE(page->emailToolNames(), tools);
+        QCOMPARE(page->selectEmailTool->currentText(), savedTool ? tools.at(1) : tools.first());
+        QCOMPARE(page->selectEmailTool->itemText(offered.size() - 1), tools.first());
 
-void TestPreferencePage::loadAndApply_data()
-{
-    QTest::addColumn<QVariant>("useSsl");
-    QTest::addColumn<QByteArray>("installFile");
-    QTest::addColumn<bool>("switchMethod");
-    QTest::addColumn<bool>("collectShown");
-    QTest::addColumn<QVariant>("useSslAfter"); // invalid: not written
-    QTest::addColumn<bool>("savedTool");       // the second program is remembered
+        // Shown again: the list does not grow.
+        sheet.showItem(0);
+        QCOMPARE(page->selectEmailTool->count(), offered.size());
 
-    const QVariant none;
-    QTest::newRow("defaults, unchanged") << none << QByteArray() << false << true << none << false;
-    QTest::newRow("installation switched off")
-        << none << QByteArray("collectusagestatistics=false\n") << false << false << none << false;
-    QTest::newRow("upload to e-mail") << QVariant(true) << QByteArray() << true << true << QVariant(false) << false;
-    QTest::newRow("program remembered") << QVariant(false) << QByteArray() << false << true << QVariant(false) << true;
-}
+        if (switchMethod)
+            (ssl ? page->emailRadioButton : page->sslRadioButton)->setChecked(true);
+        QCOMPARE(page->selectEmailTool->isEnabled(), ssl == switchMethod);
+        sheet.apply();
+        QTEST(stored(CrvC_Settings::UseSSL), "useSslAfter");
+        // With none remembered, the preferred program shown is stored.
+        QCOMPARE(stored(CrvC_Settings::SelectedEmailTool), QVariant(savedTool ? tools.at(1) : tools.first()));
+        QCOMPARE(stored(CrvC_Settings::CollectDeviceUsage), QVariant(collectShown));
+        QCOMPARE(stored(CrvC_Settings::DontShowSendProgressDlg), QVariant(false));
+        QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), QByteArray()));
+    }
 
-void TestPreferencePage::loadAndApply()
-{
-    QFETCH(QVariant, useSsl);
-    QFETCH(QByteArray, installFile);
-    QFETCH(bool, switchMethod);
-    QFETCH(bool, collectShown);
-    QFETCH(bool, savedTool);
-    store(CrvC_Settings::UseSSL, useSsl);
-    const QStringList tools = CrvC_DataCollectionEmail().emailTools();
-    QVERIFY(tools.size() >= 2);
-    if (savedTool)
-        store(CrvC_Settings::SelectedEmailTool, tools.at(1));
-    QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), installFile));
+    void applyKeepsLatestChoice()
+    {
+        // Apply reaching a page that was never shown keeps the stored choices.
+        CorvidTest::store(CrvC_Settings::DontShowSendProgressDlg, true);
+        QWidget container;
+        CrvC_DataCollectionPropPageImpl unseen(&container, "DataCollectionPage");
+        PropSheetEvent applyEvent(PropSheetEvent::ApplyChanges);
+        QCoreApplication::sendEvent(&unseen, &applyEvent);
+        QCOMPARE(stored(CrvC_Settings::CollectDeviceUsage), QVariant(true));
+        QCOMPARE(stored(CrvC_Settings::DontShowSendProgressDlg), QVariant(true));
+        QVERIFY(!stored(CrvC_Settings::UseSSL).isValid());
 
-    Gui::Clip::PropSheet sheet;
-    CrvC_DataCollectionPropPageImpl *page = showCorvidPage(sheet);
-    QVERIFY(page);
-    const bool ssl = useSsl.isValid() ? useSsl.toBool() : true;
-    QCOMPARE(page->collectionCheckBox->isChecked(), collectShown);
-    QCOMPARE(page->sslRadioButton->isChecked(), ssl);
-    QCOMPARE(page->emailRadioButton->isChecked(), !ssl);
-    QCOMPARE(page->selectEmailTool->isEnabled(), !ssl);
-    QVERIFY(!page->selectEmailTool->isEditable());
-    // The list as the e-mail sender offers it, the preferred program last and current.
-    const QStringList offered = CrvC_PreferenceValues::mailListOrder(page->emailToolNames());
-    QCOMPARE(page->selectEmailTool->count(), offered.size());
-    QCOMPARE(page->emailToolNames(), tools);
-    QCOMPARE(page->selectEmailTool->currentText(), savedTool ? tools.at(1) : tools.first());
-    QCOMPARE(page->selectEmailTool->itemText(offered.size() - 1), tools.first());
-
-    // Shown again: the list does not grow.
-    sheet.showItem(0);
-    QCOMPARE(page->selectEmailTool->count(), offered.size());
-
-    if (switchMethod)
-        (ssl ? page->emailRadioButton : page->sslRadioButton)->setChecked(true);
-    QCOMPARE(page->selectEmailTool->isEnabled(), ssl == switchMethod);
-    sheet.apply();
-    QTEST(stored(CrvC_Settings::UseSSL), "useSslAfter");
-    // With none remembered, the preferred program shown is stored.
-    QCOMPARE(stored(CrvC_Settings::SelectedEmailTool), QVariant(savedTool ? tools.at(1) : tools.first()));
-    QCOMPARE(stored(CrvC_Settings::CollectDeviceUsage), QVariant(collectShown));
-    QCOMPARE(stored(CrvC_Settings::DontShowSendProgressDlg), QVariant(false));
-    QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), QByteArray()));
-}
-
-void TestPreferencePage::applyKeepsLatestChoice()
-{
-    // Apply reaching a page that was never shown keeps the stored choices.
-    CorvidTest::store(CrvC_Settings::DontShowSendProgressDlg, true);
-    QWidget container;
-    CrvC_DataCollectionPropPageImpl unseen(&container, "DataCollectionPage");
-    PropSheetEvent applyEvent(PropSheetEvent::ApplyChanges);
-    QCoreApplication::sendEvent(&unseen, &applyEvent);
-    QCOMPARE(stored(CrvC_Settings::CollectDeviceUsage), QVariant(true));
-    QCOMPARE(stored(CrvC_Settings::DontShowSendProgressDlg), QVariant(true));
-    QVERIFY(!stored(CrvC_Settings::UseSSL).isValid());
-
-    // Apply a change, change it back, OK: the last choice is what stays.
-    Gui::Clip::PropSheet sheet;
-    CrvC_DataCollectionPropPageImpl *page = showCorvidPage(sheet);
-    page->emailRadioButton->setChecked(true);
-    sheet.apply();
-    QCOMPARE(stored(CrvC_Settings::UseSSL), QVariant(false));
-    page->sslRadioButton->setChecked(true);
-    sheet.apply();
-    QCOMPARE(stored(CrvC_Settings::UseSSL), QVariant(true));
-}
+        // Apply a change, change it back, OK: the last choice is what stays.
+        Gui::Clip::PropSheet sheet;
+        CrvC_DataCollectionPropPageImpl *page = showCorvidPage(sheet);
+        page->emailRadioButton->setChecked(true);
+        sheet.apply();
+        QCOMPARE(stored(CrvC_Settings::UseSSL), QVariant(false));
+        page->sslRadioButton->setChecked(true);
+        sheet.apply();
+        QCOMPARE(stored(CrvC_Settings::UseSSL), QVariant(true));
+    }
+};
 
 QTEST_MAIN(TestPreferencePage)
 #include "tst_preferencepage.moc"

@@ -12,35 +12,6 @@
 #include <QTabWidget>
 #include <QtTest>
 
-// The review dialog: how each way out ends exec() and whether it sends and
-// counts, the tab buttons, the links of each tab, the design-name prompt and
-// the cut of a page too large for the viewer.
-class TestReviewDialog : public QObject
-{
-    Q_OBJECT
-private Q_SLOTS:
-    void initTestCase();
-    void init();
-    void cleanupTestCase();
-    void exits_data();
-    void exits();
-    void links();
-    void missingInstalledPages();
-    void designNamePrompt_data();
-    void designNamePrompt();
-    void largeReportInDialog();
-
-public Q_SLOTS:
-    // Stands in for the desktop's web browser.
-    void openUrl(const QUrl &url) { m_opened << url.toString(); }
-
-private:
-    QString newProject(const QString &name);
-
-    std::unique_ptr<CorvidTest::Environment> m_env;
-    QStringList m_opened;
-};
-
 namespace {
 
 const char IntroductionPage[] =
@@ -49,206 +20,213 @@ const char HelpPage[] = "<html><body><h1>Help</h1><a href='#off'>off</a><a name=
 
 } // namespace
 
-void TestReviewDialog::initTestCase()
+// The review dialog: how each way out ends exec() and whether it sends and
+// counts, the tab buttons, the links of each tab, the design-name prompt and
+// the cut of a page too large for the viewer.
+class TestReviewDialog : public QObject
 {
-    m_env.reset(new CorvidTest::Environment);
-    QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvid_introduction.html"), IntroductionPage));
-    QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvid_help.html"), HelpPage));
-    for (const char *scheme : {"http", "https", "file"})
-        QDesktopServices::setUrlHandler(QLatin1String(scheme), this, "openUrl");
-    // Without a project the page goes to the working directory.
-    QDir().mkpath(m_env->home() + QLatin1String("/work"));
-    QVERIFY(QDir::setCurrent(m_env->home() + QLatin1String("/work")));
-}
-
-void TestReviewDialog::cleanupTestCase()
-{
-    for (const char *scheme : {"http", "https", "file"})
-        QDesktopServices::unsetUrlHandler(QLatin1String(scheme));
-}
-
-void TestReviewDialog::init()
-{
-    m_env->clearSettings();
-    m_opened.clear();
-}
-
-QString TestReviewDialog::newProject(const QString &name)
-{
-    const QString file = m_env->home() + QLatin1String("/projects/") + name + QLatin1String(".orb");
-    CorvidTest::writeFile(file, "<project/>");
-    return file;
-}
-
-void TestReviewDialog::exits_data()
-{
-    QTest::addColumn<QString>("action");
-    QTest::addColumn<int>("result");
-    QTest::addColumn<QString>("counter"); // the project's send counter afterwards
-    QTest::addColumn<int>("tab");         // the tab shown at the end
-
-    const int intro = CrvC_DataCollectionDialog::IntroductionTab;
-    QTest::newRow("send") << "send" << int(QDialog::Accepted) << "2" << intro;
-    QTest::newRow("decline") << "decline" << int(QDialog::Rejected) << QString() << intro;
-    QTest::newRow("escape") << "escape" << int(QDialog::Rejected) << QString() << intro;
-    QTest::newRow("close") << "close" << int(QDialog::Rejected) << QString() << intro;
-    // These two only change the tab; the dialog is then declined.
-    QTest::newRow("Verify Contents") << "verify" << int(QDialog::Rejected) << QString()
-                                     << int(CrvC_DataCollectionDialog::ContentsTab);
-    QTest::newRow("Help") << "help" << int(QDialog::Rejected) << QString()
-                          << int(CrvC_DataCollectionDialog::HelpTab);
-}
-
-void TestReviewDialog::exits()
-{
-    QFETCH(QString, action);
-    const QString project = newProject(QLatin1String(QTest::currentDataTag()));
-    CorvidTest::SendRecorder recorder;
-    CrvC_DataCollectionDialog dialog;
-    dialog.createReport(project, QStringLiteral("top"), QStringLiteral("Kestrel"));
-
-    QStringList sentWhileOpen;
-    int tab = -1;
-    CorvidTest::onNextModal<CrvC_DataCollectionDialog>([&](CrvC_DataCollectionDialog *open) {
-        if (action == QLatin1String("verify") || action == QLatin1String("help")) {
-            (action == QLatin1String("verify") ? open->verifyButton() : open->helpButton())->click();
-            tab = open->isVisible() ? open->tabWidget()->currentIndex() : -2;
-            open->declineButton()->click();
-        } else if (action == QLatin1String("send")) {
-            open->sendButton()->click();
-            sentWhileOpen = recorder.sends;
-        } else if (action == QLatin1String("decline")) {
-            open->declineButton()->click();
-        } else if (action == QLatin1String("escape")) {
-            QTest::keyClick(open, Qt::Key_Escape);
-        } else {
-            open->close();
-        }
-    });
-    QVERIFY(!dialog.contentsCut());
-    QTEST(dialog.exec(), "result");
-    QTEST(tab < 0 ? dialog.tabWidget()->currentIndex() : tab, "tab");
-
-    const bool sends = action == QLatin1String("send");
-    QCOMPARE(sentWhileOpen, sends ? QStringList{QStringLiteral("upload")} : QStringList());
-    QCOMPARE(recorder.sends.size(), sends ? 1 : 0);
-    if (sends)
-        QCOMPARE(recorder.files.first(), QFileInfo(dialog.reportPath()).absoluteFilePath());
-    QTEST(ProjectRepositoryValues::instance().getValue(
-              project, QLatin1String(ProjectRepositoryValues::SendIterationKey)),
-          "counter");
-}
-
-void TestReviewDialog::links()
-{
-    CrvC_DataCollectionDialog dialog;
-    const QUrl introduction = dialog.introductionViewer()->source();
-    QVERIFY(introduction.isLocalFile());
-
-    // Introduction: the link opens in the browser, the page stays.
-    Q_EMIT dialog.introductionViewer()->anchorClicked(QUrl(QStringLiteral("https://www.vantor.example/corvid")));
-    QCOMPARE(m_opened, QStringList{QStringLiteral("https://www.vantor.example/corvid")});
-    QCOMPARE(dialog.introductionViewer()->source(), introduction);
-
-    // Help: links are followed inside the tab, nothing opens outside.
-    QVERIFY(dialog.helpViewer()->openLinks());
-    QCOMPARE(m_opened.size(), 1);
-    QVERIFY(!QApplication::overrideCursor());
-}
-
-void TestReviewDialog::missingInstalledPages()
-{
-    // Folders in place of the pages, in the first installation root: no page
-    // to show, and the dialog still opens.
-    const QString intro = m_env->installRoot() + QLatin1String("/data/reports/corvid_introduction.html");
-    const QString help = m_env->installRoot() + QLatin1String("/data/reports/corvid_help.html");
-    for (const QString &page : {intro, help}) {
-        QVERIFY(QFile::rename(page, page + QLatin1String(".off")));
-        QVERIFY(QDir().mkdir(page));
-    }
-    CrvC_DataCollectionDialog dialog;
-    for (const QString &page : {intro, help}) {
-        QVERIFY(QDir().rmdir(page));
-        QVERIFY(QFile::rename(page + QLatin1String(".off"), page));
+    Q_OBJECT
+private Q_SLOTS:
+    void initTestCase()
+    {
+        m_env.reset(new CorvidTest::Environment);
+        QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvid_introduction.html"), IntroductionPage));
+        QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvid_help.html"), HelpPage));
+        for (const char *scheme : {"http", "https", "file"})
+            QDesktopServices::setUrlHandler(QLatin1String(scheme), this, "openUrl");
+        // Without a project the page goes to the working directory.
+        QDir().mkpath(m_env->home() + QLatin1String("/work"));
+        QVERIFY(QDir::setCurrent(m_env->home() + QLatin1String("/work")));
     }
 
-    QVERIFY(dialog.introductionViewer()->toPlainText().startsWith(
-        QLatin1String("The HTML page containing the Introduction for the Corvid feature is missing.")));
-    QVERIFY(dialog.helpViewer()->toPlainText().startsWith(
-        QLatin1String("The HTML page containing the Help for the Corvid feature is missing.")));
-}
+    void init()
+    {
+        m_env->clearSettings();
+        m_opened.clear();
+    }
 
-void TestReviewDialog::designNamePrompt_data()
-{
-    QTest::addColumn<QString>("typed"); // null: the prompt is cancelled
-    QTest::addColumn<QString>("design");
+    void cleanupTestCase()
+    {
+        for (const char *scheme : {"http", "https", "file"})
+            QDesktopServices::unsetUrlHandler(QLatin1String(scheme));
+    }
 
-    QTest::newRow("typed with blanks") << "  led  " << "led";
-    QTest::newRow("cancelled") << QString() << QString();
-}
+    void exits_data()
+    {
+        QTest::addColumn<QString>("action");
+        QTest::addColumn<int>("result");
+        QTest::addColumn<QString>("counter"); // the project's send counter afterwards
+        QTest::addColumn<int>("tab");         // the tab shown at the end
 
-void TestReviewDialog::designNamePrompt()
-{
-    QFETCH(QString, typed);
-    QFETCH(QString, design);
-    // A design "led" with a synthesis report that names its device.
-    CorvidTest::writeFile(QStringLiteral("led_map.ktp"), "Target Device  : ks3s500\nTarget Package : fg320\n");
-    QString title;
-    QString label;
-    CorvidTest::onNextModal<QInputDialog>([&](QInputDialog *prompt) {
-        title = prompt->windowTitle();
-        label = prompt->labelText();
-        if (typed.isNull()) {
-            prompt->reject();
-        } else {
-            prompt->setTextValue(typed);
-            prompt->accept();
+        const int intro = CrvC_DataCollectionDialog::IntroductionTab;
+        QTest::newRow("send") << "send" << int(QDialog::Accepted) << "2" << intro;
+        QTest::newRow("decline") << "decline" << int(QDialog::Rejected) << QString() << intro;
+        QTest::newRow("close") << "close" << int(QDialog::Rejected) << QString() << intro;
+        // These two only change the tab; the dialog is then declined.
+        QTest::newRow("Verify Contents") << "verify" << int(QDialog::Rejected) << QString()
+                                         << int(CrvC_DataCollectionDialog::ContentsTab);
+        QTest::newRow("Help") << "help" << int(QDialog::Rejected) << QString()
+                              << int(CrvC_DataCollectionDialog::HelpTab);
+    }
+
+    void exits()
+    {
+        QFETCH(QString, action);
+        const QString project = newProject(QLatin1String(QTest::currentDataTag()));
+        CorvidTest::SendRecorder recorder;
+        CrvC_DataCollectionDialog dialog;
+        dialog.createReport(project, QStringLiteral("top"), QStringLiteral("Kestrel"));
+
+        QStringList sentWhileOpen;
+        int tab = -1;
+        CorvidTest::onNextModal<CrvC_DataCollectionDialog>([&](CrvC_DataCollectionDialog *open) {
+            if (action == QLatin1String("verify") || action == QLatin1String("help")) {
+                (action == QLatin1String("verify") ? open->verifyButton() : open->helpButton())->click();
+                tab = open->isVisible() ? open->tabWidget()->currentIndex() : -2;
+                open->declineButton()->click();
+            } else if (action == QLatin1String("send")) {
+                open->sendButton()->click();
+                sentWhileOpen = recorder.sends;
+            } else if (action == QLatin1String("decline")) {
+                open->declineButton()->click();
+            } else {
+                open->close();
+            }
+        });
+        QVERIFY(!dialog.contentsCut());
+        QTEST(dialog.exec(), "result");
+        QTEST(tab < 0 ? dialog.tabWidget()->currentIndex() : tab, "tab");
+
+        const bool sends = action == QLatin1String("send");
+        QCOMPARE(sentWhileOpen, sends ? QStringList{QStringLiteral("upload")} : QStringList());
+        QCOMPARE(recorder.sends.size(), sends ? 1 : 0);
+        if (sends)
+            QCOMPARE(recorder.files.first(), QFileInfo(dialog.reportPath()).absoluteFilePath());
+        QTEST(ProjectRepositoryValues::instance().getValue(
+                  project, QLatin1String(ProjectRepositoryValues::SendIterationKey)),
+              "counter");
+    }
+
+    void links()
+    {
+        CrvC_DataCollectionDialog dialog;
+        const QUrl introduction = dialog.introductionViewer()->source();
+        QVERIFY(introduction.isLocalFile());
+
+        // Introduction: the link opens in the browser, the page stays.
+        Q_EMIT dialog.introductionViewer()->anchorClicked(QUrl(QStringLiteral("https://www.vantor.example/corvid")));
+        QCOMPARE(m_opened, QStringList{QStringLiteral("https://www.vantor.example/corvid")});
+        QCOMPARE(dialog.introductionViewer()->source(), introduction);
+
+        // Help: links are followed inside the tab, nothing opens outside.
+        QVERIFY(dialog.helpViewer()->openLinks());
+        QCOMPARE(m_opened.size(), 1);
+        QVERIFY(!QApplication::overrideCursor());
+    }
+
+    void missingInstalledPages()
+    {
+        // Folders in place of the pages, in the first installation root: no page
+        // to show, and the dialog still opens.
+        const QString intro = m_env->installRoot() + QLatin1String("/data/reports/corvid_introduction.html");
+        const QString help = m_env->installRoot() + QLatin1String("/data/reports/corvid_help.html");
+        for (const QString &page : {intro, help}) {
+            QVERIFY(QFile::rename(page, page + QLatin1String(".off")));
+            QVERIFY(QDir().mkdir(page));
         }
-    });
-    CrvC_DataCollectionDialog dialog;
-    dialog.createReport(newProject(QStringLiteral("prompt")), QString(), QStringLiteral("Kestrel"));
+        CrvC_DataCollectionDialog dialog;
+        for (const QString &page : {intro, help}) {
+            QVERIFY(QDir().rmdir(page));
+            QVERIFY(QFile::rename(page + QLatin1String(".off"), page));
+        }
 
-    QCOMPARE(title, QStringLiteral("Corvid"));
-    QCOMPARE(label, QStringLiteral("Enter the design name:"));
-    QVERIFY(!QApplication::overrideCursor());
-    QVERIFY(QFileInfo(dialog.reportPath()).isFile());
-    QCOMPARE(dialog.builder().data().targetDevice.isEmpty(), design.isEmpty());
-}
+        QVERIFY(dialog.introductionViewer()->toPlainText().startsWith(
+            QLatin1String("The HTML page containing the Introduction for the Corvid feature is missing.")));
+        QVERIFY(dialog.helpViewer()->toPlainText().startsWith(
+            QLatin1String("The HTML page containing the Help for the Corvid feature is missing.")));
+    }
 
-void TestReviewDialog::largeReportInDialog()
-{
-    // A usage page of the design tools well above the viewer's limit lands
-    // in the report whole; the tab shows its beginning and the link opens
-    // the whole report in the browser.
-    QByteArray big = "<HTML><BODY><TABLE>\n";
-    while (big.size() < CrvC_DataCollectionDialog::ContentsLimit * 2)
-        big += "<TR><TD>net_0001</TD><TD>12</TD><TD>routed</TD></TR>\n";
-    big += "</TABLE></BODY></HTML>\n";
-    CorvidTest::writeFile(QStringLiteral("par_usage_statistics.html"), big);
+    void designNamePrompt_data()
+    {
+        QTest::addColumn<QString>("typed"); // null: the prompt is cancelled
+        QTest::addColumn<QString>("design");
 
-    CrvC_DataCollectionDialog dialog;
-    dialog.createReport(newProject(QStringLiteral("large")), QStringLiteral("large"), QString());
-    QFile::remove(QStringLiteral("par_usage_statistics.html"));
-    const QString page = dialog.builder().pageText();
-    QVERIFY(page.size() > CrvC_DataCollectionDialog::ContentsLimit);
-    QVERIFY(dialog.contentsCut());
-    QVERIFY(dialog.contentsViewer()->toPlainText().size() < CrvC_DataCollectionDialog::ContentsLimit);
+        QTest::newRow("typed with blanks") << "  led  " << "led";
+        QTest::newRow("cancelled") << QString() << QString();
+    }
 
-    // The notice with the link comes right after the body tag; the page
-    // follows in whole lines.
-    const QString text = CrvC_DataCollectionDialog::contentsText(page);
-    const qsizetype notice = text.indexOf(QLatin1String("<P><B>"));
-    const qsizetype noticeEnd = text.indexOf(QLatin1String("<HR>"), notice) + 4;
-    QVERIFY(text.left(notice).endsWith(QLatin1Char('>')) && text.left(notice).contains(QLatin1String("<BODY")));
-    QVERIFY(text.mid(notice, noticeEnd - notice).contains(QLatin1String(CrvC_DataCollectionDialog::BrowseContentsUrl)));
-    const QString shown = text.left(notice) + text.mid(noticeEnd);
-    QVERIFY(page.startsWith(shown));
-    QCOMPARE(page.at(shown.size()), QLatin1Char('\n'));
+    void designNamePrompt()
+    {
+        QFETCH(QString, typed);
+        QFETCH(QString, design);
+        // A design "led" with a synthesis report that names its device.
+        CorvidTest::writeFile(QStringLiteral("led_map.ktp"), "Target Device  : ks3s500\nTarget Package : fg320\n");
+        CorvidTest::onNextModal<QInputDialog>([&](QInputDialog *prompt) {
+            if (typed.isNull()) {
+                prompt->reject();
+            } else {
+                prompt->setTextValue(typed);
+                prompt->accept();
+            }
+        });
+        CrvC_DataCollectionDialog dialog;
+        dialog.createReport(newProject(QStringLiteral("prompt")), QString(), QStringLiteral("Kestrel"));
 
-    Q_EMIT dialog.contentsViewer()->anchorClicked(QUrl(QLatin1String(CrvC_DataCollectionDialog::BrowseContentsUrl)));
-    QCOMPARE(m_opened, QStringList{QUrl::fromLocalFile(QFileInfo(dialog.reportPath()).absoluteFilePath()).toString()});
-    QVERIFY(!QApplication::overrideCursor());
-}
+        QVERIFY(!QApplication::overrideCursor());
+        QVERIFY(QFileInfo(dialog.reportPath()).isFile());
+        QCOMPARE(dialog.builder().data().targetDevice.isEmpty(), design.isEmpty());
+    }
+
+    void largeReportInDialog()
+    {
+        // A usage page of the design tools well above the viewer's limit lands
+        // in the report whole; the tab shows its beginning and the link opens
+        // the whole report in the browser.
+        QByteArray big = "<HTML><BODY><TABLE>\n";
+        while (big.size() < CrvC_DataCollectionDialog::ContentsLimit * 2)
+            big += "<TR><TD>net_0001</TD><TD>12</TD><TD>routed</TD></TR>\n";
+        big += "</TABLE></BODY></HTML>\n";
+        CorvidTest::writeFile(QStringLiteral("par_usage_statistics.html"), big);
+
+        CrvC_DataCollectionDialog dialog;
+        dialog.createReport(newProject(QStringLiteral("large")), QStringLiteral("large"), QString());
+        QFile::remove(QStringLiteral("par_usage_statistics.html"));
+        const QString page = dialog.builder().pageText();
+        QVERIFY(page.size() > CrvC_DataCollectionDialog::ContentsLimit);
+        QVERIFY(dialog.contentsCut());
+        QVERIFY(dialog.contentsViewer()->toPlainText().size() < CrvC_DataCollectionDialog::ContentsLimit);
+
+        // The notice with the link comes right after the body tag; the page
+        // follows in whole lines.
+        const QString text = CrvC_DataCollectionDialog::contentsText(page);
+        const qsizetype notice = text.indexOf(QLatin1String("<P><B>"));
+        const qsizetype noticeEnd = text.indexOf(QLatin1String("<HR>"), notice) + 4;
+        QVERIFY(text.left(notice).endsWith(QLatin1Char('>')) && text.left(notice).contains(QLatin1String("<BODY")));
+        QVERIFY(text.mid(notice, noticeEnd - notice).contains(QLatin1String(CrvC_DataCollectionDialog::BrowseContentsUrl)));
+        const QString shown = text.left(notice) + text.mid(noticeEnd);
+        QVERIFY(page.startsWith(shown));
+        QCOMPARE(page.at(shown.size()), QLatin1Char('\n'));
+
+        Q_EMIT dialog.contentsViewer()->anchorClicked(QUrl(QLatin1String(CrvC_DataCollectionDialog::BrowseContentsUrl)));
+        QCOMPARE(m_opened, QStringList{QUrl::fromLocalFile(QFileInfo(dialog.reportPath()).absoluteFilePath()).toString()});
+        QVERIFY(!QApplication::overrideCursor());
+    }
+
+public Q_SLOTS:
+    // Stands in for the desktop's web browser.
+    void openUrl(const QUrl &url) { m_opened << url.toString(); }
+
+private:
+    QString newProject(const QString &name)
+    {
+        const QString file = m_env->home() + QLatin1String("/projects/") + name + QLatin1String(".orb");
+        CorvidTest::writeFile(file, "<project/>");
+        return file;
+    }
+
+    std::unique_ptr<CorvidTest::Environment> m_env;
+    QStringList m_opened;
+};
 
 QTEST_MAIN(TestReviewDialog)
 #include "tst_reviewdialog.moc"

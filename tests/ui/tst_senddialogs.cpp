@@ -10,6 +10,11 @@
 #include <QDir>
 #include <QtTest>
 
+using CorvidTest::store;
+using CorvidTest::stored;
+
+const QString Report = QStringLiteral("/p/device_usage_statistics.html");
+
 // The send method dialog (how it opens, what OK and Cancel store and send,
 // when it is shown at all) and the countdown (five ticks then the send,
 // Details and Cancel open the review, closing sends nothing). Ticks are
@@ -17,184 +22,168 @@
 class TestSendDialogs : public QObject
 {
     Q_OBJECT
-private Q_SLOTS:
-    void initTestCase();
-    void init() { m_env->clearSettings(); }
-    void methodDialogOpens_data();
-    void methodDialogOpens();
-    void methodDialogEnds_data();
-    void methodDialogEnds();
-    void countdown_data();
-    void countdown();
-
-private:
     std::unique_ptr<CorvidTest::Environment> m_env;
-};
 
-using CorvidTest::store;
-using CorvidTest::stored;
-
-const QString Report = QStringLiteral("/p/device_usage_statistics.html");
-
-void TestSendDialogs::initTestCase()
-{
-    m_env.reset(new CorvidTest::Environment);
-    QDir().mkpath(m_env->home() + QLatin1String("/work"));
-    QVERIFY(QDir::setCurrent(m_env->home() + QLatin1String("/work")));
-}
-
-void TestSendDialogs::methodDialogOpens_data()
-{
-    QTest::addColumn<QVariant>("useSsl");
-    QTest::addColumn<QVariant>("dontShow");
-    QTest::addColumn<QVariant>("tool");
-    QTest::addColumn<QString>("entry"); // "ask": showSendMethodDialog; "email": ...ForEmail
-    QTest::addColumn<bool>("shown");
-    QTest::addColumn<bool>("emailChecked");
-    QTest::addColumn<bool>("boxChecked");
-
-    const QVariant none, yes(true), no(false);
-    QTest::newRow("nothing stored: no dialog") << none << none << none << "ask" << false << false << false;
-    QTest::newRow("e-mail stored") << no << none << QVariant("mutt") << "ask" << true << true << true;
-    QTest::newRow("automatic, no program") << no << yes << none << "ask" << true << true << true;
-    QTest::newRow("after a failed upload") << none << no << none << "email" << true << true << false;
-}
-
-void TestSendDialogs::methodDialogOpens()
-{
-    QFETCH(QVariant, useSsl);
-    QFETCH(QVariant, dontShow);
-    QFETCH(QVariant, tool);
-    QFETCH(QString, entry);
-    store(CrvC_Settings::UseSSL, useSsl);
-    store(CrvC_Settings::DontShowSendToDlg, dontShow);
-    store(CrvC_Settings::SelectedEmailTool, tool);
-    CorvidTest::SendRecorder recorder;
-
-    bool shown = false, email = false, listEnabled = false, box = false;
-    QPointer<QTimer> poll = CorvidTest::onNextModal<CrvC_SendToClipDlg>([&](CrvC_SendToClipDlg *dialog) {
-        shown = true;
-        email = dialog->imp()->emailRadioButton->isChecked();
-        listEnabled = dialog->imp()->selectEmailTool->isEnabled();
-        box = dialog->imp()->dontShowAgain->isChecked();
-        // The program list follows the method.
-        dialog->imp()->sslRadioButton->setChecked(true);
-        listEnabled = listEnabled && !dialog->imp()->selectEmailTool->isEnabled();
-        dialog->reject();
-    });
-    if (entry == QLatin1String("ask"))
-        CrvC_SendToClipDlg::showSendMethodDialog(nullptr, Report);
-    else
-        CrvC_SendToClipDlg::showSendMethodDialogForEmail(nullptr, Report);
-    delete poll;
-
-    QTEST(shown, "shown");
-    QCOMPARE(recorder.sends, shown ? QStringList() : QStringList{QStringLiteral("upload")});
-    if (!shown)
-        return;
-    QTEST(email, "emailChecked");
-    QCOMPARE(listEnabled, email);
-    QTEST(box, "boxChecked");
-}
-
-void TestSendDialogs::methodDialogEnds_data()
-{
-    QTest::addColumn<QString>("button");
-    QTest::addColumn<bool>("chooseEmail");
-    QTest::addColumn<QVariant>("useSsl"); // stored afterwards
-    QTest::addColumn<QVariant>("dontShow");
-    QTest::addColumn<QStringList>("started");
-
-    const QVariant none;
-    QTest::newRow("OK, unchanged") << "ok" << false << none << QVariant(true) << QStringList{"upload"};
-    // No mail program: nothing can start, and nothing is shown.
-    QTest::newRow("OK, e-mail without program") << "ok" << true << QVariant(false) << QVariant(true) << QStringList();
-    QTest::newRow("Cancel") << "cancel" << true << none << none << QStringList();
-    QTest::newRow("closed") << "close" << true << none << none << QStringList();
-}
-
-void TestSendDialogs::methodDialogEnds()
-{
-    QFETCH(QString, button);
-    QFETCH(bool, chooseEmail);
-    CorvidTest::SendRecorder recorder;
-    CrvC_SendToClipDlg dialog(nullptr, Report);
-    QCOMPARE(dialog.windowTitle(), QStringLiteral("Send To Vantor"));
-    if (chooseEmail) {
-        dialog.imp()->emailRadioButton->setChecked(true);
-        dialog.imp()->selectEmailTool->clear();
+private Q_SLOTS:
+    void initTestCase()
+    {
+        m_env.reset(new CorvidTest::Environment);
+        QDir().mkpath(m_env->home() + QLatin1String("/work"));
+        QVERIFY(QDir::setCurrent(m_env->home() + QLatin1String("/work")));
     }
-    CorvidTest::onNextModal<CrvC_SendToClipDlg>([&](CrvC_SendToClipDlg *open) {
-        if (button == QLatin1String("ok"))
-            open->imp()->okButton->click();
-        else if (button == QLatin1String("cancel"))
-            open->imp()->cancelButton->click();
+    void init() { m_env->clearSettings(); }
+
+    void methodDialogOpens_data()
+    {
+        QTest::addColumn<QVariant>("useSsl");
+        QTest::addColumn<QVariant>("dontShow");
+        QTest::addColumn<QVariant>("tool");
+        QTest::addColumn<QString>("entry"); // "ask": showSendMethodDialog; "email": ...ForEmail
+        QTest::addColumn<bool>("shown");
+        QTest::addColumn<bool>("emailChecked");
+        QTest::addColumn<bool>("boxChecked");
+
+        const QVariant none, yes(true), no(false);
+        QTest::newRow("nothing stored: no dialog") << none << none << none << "ask" << false << false << false;
+        QTest::newRow("e-mail stored") << no << none << QVariant("mutt") << "ask" << true << true << true;
+        QTest::newRow("automatic, no program") << no << yes << none << "ask" << true << true << true;
+        QTest::newRow("after a failed upload") << none << no << none << "email" << true << true << false;
+    }
+
+    void methodDialogOpens()
+    {
+        QFETCH(QVariant, useSsl);
+        QFETCH(QVariant, dontShow);
+        QFETCH(QVariant, tool);
+        QFETCH(QString, entry);
+        store(CrvC_Settings::UseSSL, useSsl);
+        store(CrvC_Settings::DontShowSendToDlg, dontShow);
+        store(CrvC_Settings::SelectedEmailTool, tool);
+        CorvidTest::SendRecorder recorder;
+
+        bool shown = false, email = false, listEnabled = false, box = false;
+        QPointer<QTimer> poll = CorvidTest::onNextModal<CrvC_SendToClipDlg>([&](CrvC_SendToClipDlg *dialog) {
+            shown = true;
+            email = dialog->imp()->emailRadioButton->isChecked();
+            listEnabled = dialog->imp()->selectEmailTool->isEnabled();
+            box = dialog->imp()->dontShowAgain->isChecked();
+            // The program list follows the method.
+            dialog->imp()->sslRadioButton->setChecked(true);
+            listEnabled = listEnabled && !dialog->imp()->selectEmailTool->isEnabled();
+            dialog->reject();
+        });
+        if (entry == QLatin1String("ask"))
+            CrvC_SendToClipDlg::showSendMethodDialog(nullptr, Report);
         else
-            open->close();
-    });
-    QCOMPARE(dialog.exec(), int(button == QLatin1String("ok") ? QDialog::Accepted : QDialog::Rejected));
-    QTEST(stored(CrvC_Settings::UseSSL), "useSsl");
-    QTEST(stored(CrvC_Settings::DontShowSendToDlg), "dontShow");
-    QVERIFY(!stored(CrvC_Settings::SelectedEmailTool).isValid());
-    QTEST(recorder.sends, "started");
-}
+            CrvC_SendToClipDlg::showSendMethodDialogForEmail(nullptr, Report);
+        delete poll;
 
-void TestSendDialogs::countdown_data()
-{
-    QTest::addColumn<QString>("end"); // "ticks", "details", "cancel", "close"
-    QTest::addColumn<bool>("sendInReview");
-    QTest::addColumn<int>("sends");
-    QTest::addColumn<bool>("boxStored");
-
-    QTest::newRow("five ticks") << "ticks" << false << 1 << true;
-    QTest::newRow("Details, declined") << "details" << false << 0 << false;
-    QTest::newRow("Cancel, declined") << "cancel" << false << 0 << false;
-    QTest::newRow("Cancel, sent in the review") << "cancel" << true << 1 << false;
-    QTest::newRow("window closed") << "close" << false << 0 << false;
-}
-
-void TestSendDialogs::countdown()
-{
-    QFETCH(QString, end);
-    QFETCH(bool, sendInReview);
-    CorvidTest::SendRecorder recorder;
-    QPointer<CrvC_SendClipDlg> dialog =
-        new CrvC_SendClipDlg(nullptr, m_env->home() + QLatin1String("/p.orb"), QStringLiteral("top"), QString());
-    QVERIFY(dialog->timer()->isActive());
-    dialog->show();
-    dialog->imp()->dontShowAgain->setChecked(true);
-    for (int tick = 1; tick <= 4; ++tick) {
-        dialog->OnTimeOut();
-        QCOMPARE(dialog->imp()->progressBar->value(), tick);
+        QTEST(shown, "shown");
+        QCOMPARE(recorder.sends, shown ? QStringList() : QStringList{QStringLiteral("upload")});
+        if (!shown)
+            return;
+        QTEST(email, "emailChecked");
+        QCOMPARE(listEnabled, email);
+        QTEST(box, "boxChecked");
     }
-    QVERIFY(recorder.sends.isEmpty());
-    const QString report = QFileInfo(dialog->reviewDialog()->reportPath()).absoluteFilePath();
 
-    bool reviewed = false;
-    CrvC_SendClipDlg *countdown = dialog;
-    QPointer<QTimer> poll = CorvidTest::onNextModal<CrvC_DataCollectionDialog>([&](CrvC_DataCollectionDialog *review) {
-        reviewed = review == countdown->reviewDialog() && !countdown->timer()->isActive();
-        (sendInReview ? review->sendButton() : review->declineButton())->click();
-    });
-    if (end == QLatin1String("ticks"))
-        dialog->OnTimeOut();
-    else if (end == QLatin1String("details"))
-        dialog->imp()->detailsButton->click();
-    else if (end == QLatin1String("cancel"))
-        dialog->imp()->cancelButton->click();
-    else
-        dialog->close();
-    delete poll;
+    void methodDialogEnds_data()
+    {
+        QTest::addColumn<QString>("button");
+        QTest::addColumn<bool>("chooseEmail");
+        QTest::addColumn<QVariant>("useSsl"); // stored afterwards
+        QTest::addColumn<QVariant>("dontShow");
+        QTest::addColumn<QStringList>("started");
 
-    QCOMPARE(reviewed, end == QLatin1String("details") || end == QLatin1String("cancel"));
-    QTEST(int(recorder.sends.size()), "sends");
-    if (!recorder.files.isEmpty())
-        QCOMPARE(recorder.files.first(), report);
-    QFETCH(bool, boxStored);
-    QCOMPARE(stored(CrvC_Settings::DontShowSendProgressDlg), boxStored ? QVariant(true) : QVariant());
-    QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
-    QVERIFY(dialog.isNull());
-}
+        const QVariant none;
+        QTest::newRow("OK, unchanged") << "ok" << false << none << QVariant(true) << QStringList{"upload"};
+        // No mail program: nothing can start, and nothing is shown.
+        QTest::newRow("OK, e-mail without program") << "ok" << true << QVariant(false) << QVariant(true) << QStringList();
+        QTest::newRow("Cancel") << "cancel" << true << none << none << QStringList();
+        QTest::newRow("closed") << "close" << true << none << none << QStringList();
+    }
+
+    void methodDialogEnds()
+    {
+        QFETCH(QString, button);
+        QFETCH(bool, chooseEmail);
+        CorvidTest::SendRecorder recorder;
+        CrvC_SendToClipDlg dialog(nullptr, Report);
+        if (chooseEmail) {
+            dialog.imp()->emailRadioButton->setChecked(true);
+            dialog.imp()->selectEmailTool->clear();
+        }
+        CorvidTest::onNextModal<CrvC_SendToClipDlg>([&](CrvC_SendToClipDlg *open) {
+            if (button == QLatin1String("ok"))
+                open->imp()->okButton->click();
+            else if (button == QLatin1String("cancel"))
+                open->imp()->cancelButton->click();
+            else
+                open->close();
+        });
+        QCOMPARE(dialog.exec(), int(button == QLatin1String("ok") ? QDialog::Accepted : QDialog::Rejected));
+        QTEST(stored(CrvC_Settings::UseSSL), "useSsl");
+        QTEST(stored(CrvC_Settings::DontShowSendToDlg), "dontShow");
+        QVERIFY(!stored(CrvC_Settings::SelectedEmailTool).isValid());
+        QTEST(recorder.sends, "started");
+    }
+
+    void countdown_data()
+    {
+        QTest::addColumn<QString>("end"); // "ticks", "details", "cancel", "close"
+        QTest::addColumn<bool>("sendInReview");
+        QTest::addColumn<int>("sends");
+        QTest::addColumn<bool>("boxStored");
+
+        QTest::newRow("five ticks") << "ticks" << false << 1 << true;
+        QTest::newRow("Details, declined") << "details" << false << 0 << false;
+        QTest::newRow("Cancel, sent in the review") << "cancel" << true << 1 << false;
+        QTest::newRow("window closed") << "close" << false << 0 << false;
+    }
+
+    void countdown()
+    {
+        QFETCH(QString, end);
+        QFETCH(bool, sendInReview);
+        CorvidTest::SendRecorder recorder;
+        QPointer<CrvC_SendClipDlg> dialog =
+            new CrvC_SendClipDlg(nullptr, m_env->home() + QLatin1String("/p.orb"), QStringLiteral("top"), QString());
+        QVERIFY(dialog->timer()->isActive());
+        dialog->show();
+        dialog->imp()->dontShowAgain->setChecked(true);
+        for (int tick = 1; tick <= 4; ++tick) {
+            dialog->OnTimeOut();
+            QCOMPARE(dialog->imp()->progressBar->value(), tick);
+        }
+        QVERIFY(recorder.sends.isEmpty());
+        const QString report = QFileInfo(dialog->reviewDialog()->reportPath()).absoluteFilePath();
+
+        bool reviewed = false;
+        CrvC_SendClipDlg *countdown = dialog;
+        QPointer<QTimer> poll = CorvidTest::onNextModal<CrvC_DataCollectionDialog>([&](CrvC_DataCollectionDialog *review) {
+            reviewed = review == countdown->reviewDialog() && !countdown->timer()->isActive();
+            (sendInReview ? review->sendButton() : review->declineButton())->click();
+        });
+        if (end == QLatin1String("ticks"))
+            dialog->OnTimeOut();
+        else if (end == QLatin1String("details"))
+            dialog->imp()->detailsButton->click();
+        else if (end == QLatin1String("cancel"))
+            dialog->imp()->cancelButton->click();
+        else
+            dialog->close();
+        delete poll;
+
+        QCOMPARE(reviewed, end == QLatin1String("details") || end == QLatin1String("cancel"));
+        QTEST(int(recorder.sends.size()), "sends");
+        if (!recorder.files.isEmpty())
+            QCOMPARE(recorder.files.first(), report);
+        QFETCH(bool, boxStored);
+        QCOMPARE(stored(CrvC_Settings::DontShowSendProgressDlg), boxStored ? QVariant(true) : QVariant());
+        QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
+        QVERIFY(dialog.isNull());
+    }
+};
 
 QTEST_MAIN(TestSendDialogs)
 #include "tst_senddialogs.moc"

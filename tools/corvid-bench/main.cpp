@@ -6,8 +6,12 @@
 //   corvid-bench [--scale F] [--steps N] [--keep DIR]
 //
 // Scale 1 is the reference project: 200,000 command-log lines, a usage XML of
-// about 50 MB, 20,000 core instances, 20,000 help entries. Step k of N builds
+// about 63 MB, 20,000 core instances, 20,000 help entries. Step k of N builds
 // the project at k/N of the scale.
+//
+// When xmllint is installed, each step also times `xmllint --noout` on the
+// same usage XML: the cost of merely parsing the largest input, measured in
+// the same run, as a floor to read the build time against.
 
 #include "host/Version.h"
 #include "report/ReportBuilder.h"
@@ -18,11 +22,15 @@
 #include <QElapsedTimer>
 #include <QFile>
 #include <QFileInfo>
+#include <QProcess>
 #include <QPushButton>
+#include <QStandardPaths>
 #include <QTemporaryDir>
 
 #include <sys/resource.h>
+#include <time.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <functional>
 
@@ -202,11 +210,60 @@ bool generate(const QString &dir, const QString &design, const Sizes &s, qint64 
     return ok;
 }
 
+// The process's peak resident set so far (VmHWM), in KiB; 0 when unknown.
 long peakRssKiB()
+{
+    QFile status(QStringLiteral("/proc/self/status"));
+    if (!status.open(QIODevice::ReadOnly | QIODevice::Text))
+        return 0;
+    // Files under /proc have no size: read to the end rather than test atEnd().
+    for (const QByteArray &line : status.readAll().split('\n')) {
+        if (line.startsWith("VmHWM:"))
+            return line.mid(6).simplified().split(' ').value(0).toLong();
+    }
+    return 0;
+}
+
+// Processor time of this process so far (all threads, user and system), in ms.
+qint64 cpuMs()
 {
     rusage usage{};
     getrusage(RUSAGE_SELF, &usage);
-    return usage.ru_maxrss;
+    return qint64(usage.ru_utime.tv_sec + usage.ru_stime.tv_sec) * 1000
+        + (usage.ru_utime.tv_usec + usage.ru_stime.tv_usec) / 1000;
+}
+
+// Processor time of the calling thread so far, in ms: the part of a build
+// that no other thread can take over.
+qint64 threadCpuMs()
+{
+    timespec t{};
+    clock_gettime(CLOCK_THREAD_CPUTIME_ID, &t);
+    return qint64(t.tv_sec) * 1000 + t.tv_nsec / 1000000;
+}
+
+// Starts the peak resident set afresh from the present one, so that each
+// step's peak is its own; false where the system does not allow it.
+bool resetPeakRss()
+{
+    QFile clear(QStringLiteral("/proc/self/clear_refs"));
+    return clear.open(QIODevice::WriteOnly) && clear.write("5") == 1;
+}
+
+// Milliseconds that `xmllint --noout file` takes; -1 when it cannot run.
+qint64 xmllintMs(const QString &xmllint, const QString &file)
+{
+    if (xmllint.isEmpty())
+        return -1;
+    QProcess process;
+    process.setProcessChannelMode(QProcess::ForwardedErrorChannel);
+    QElapsedTimer timer;
+    timer.start();
+    process.start(xmllint, {QStringLiteral("--noout"), QStringLiteral("--huge"), file});
+    if (!process.waitForFinished(-1) || process.exitStatus() != QProcess::NormalExit
+        || process.exitCode() != 0)
+        return -1;
+    return timer.elapsed();
 }
 
 } // namespace
@@ -237,8 +294,11 @@ int main(int argc, char **argv)
 
     QTemporaryDir temp;
     const QString root = keep.isEmpty() ? temp.path() : QFileInfo(keep).absoluteFilePath();
-    std::printf("%-6s %12s %12s %10s %10s %12s %12s %12s\n", "step", "cmd lines", "usage items",
-                "cores", "help", "input MB", "build ms", "dialog ms");
+    const QString xmllint = QStandardPaths::findExecutable(QStringLiteral("xmllint"));
+    std::printf("%-5s %10s %12s %7s %7s %9s %9s %8s %9s %11s %8s %10s\n", "step", "cmd lines",
+                "usage items", "cores", "help", "input MB", "build ms", "cpu ms", "main cpu",
+                "xmllint ms", "peak MB", "dialog ms");
+    long buildsPeakKiB = 0, runPeakKiB = 0;
     for (int step = 1; step <= steps; ++step) {
         const Sizes sizes = sizesFor(scale * step / steps);
         const QString dir = root + QLatin1String("/step") + QString::number(step);
@@ -251,12 +311,19 @@ int main(int argc, char **argv)
         qputenv("APPDATA", QFile::encodeName(dir + QLatin1String("/appdata")));
         QDir::setCurrent(dir);
 
+        runPeakKiB = std::max(runPeakKiB, peakRssKiB());
+        const bool stepPeak = resetPeakRss();
+        const qint64 cpuBefore = cpuMs();
+        const qint64 mainBefore = threadCpuMs();
         QElapsedTimer timer;
         timer.start();
         CrvC_DataCollectionDialog dialog;
         CrvC_ReportBuilder &builder = dialog.builder();
         builder.createReport(QString(), QStringLiteral("bench"), QStringLiteral("Xc6"));
         const qint64 ms = timer.elapsed();
+        const qint64 cpu = cpuMs() - cpuBefore;
+        const qint64 mainCpu = threadCpuMs() - mainBefore;
+        const long buildPeak = peakRssKiB();
 
         // The review dialog after the build: the page into the Contents tab,
         // the dialog on screen, and a click on "Verify Contents" answered
@@ -273,13 +340,23 @@ int main(int argc, char **argv)
             std::fprintf(stderr, "corvid-bench: the page was not written\n");
             return 1;
         }
-        std::printf("%-6d %12d %12d %10d %10d %12.1f %12lld %12lld\n", step, sizes.commandLines,
-                    sizes.usageItems, sizes.coreInstances, sizes.helpEntries, bytes / 1048576.0,
-                    static_cast<long long>(ms), static_cast<long long>(dialogMs));
+        const qint64 floorMs = xmllintMs(xmllint, dir + QLatin1String("/bench_usage.xml"));
+        std::printf("%-5d %10d %12d %7d %7d %9.1f %9lld %8lld %9lld %11s %8.1f %10lld\n", step,
+                    sizes.commandLines, sizes.usageItems, sizes.coreInstances, sizes.helpEntries,
+                    bytes / 1048576.0, static_cast<long long>(ms), static_cast<long long>(cpu),
+                    static_cast<long long>(mainCpu),
+                    floorMs < 0 ? "-" : qPrintable(QString::number(floorMs)),
+                    buildPeak / 1024.0, static_cast<long long>(dialogMs));
+        buildsPeakKiB = std::max(buildsPeakKiB, buildPeak);
+        if (!stepPeak)
+            std::printf("(the peak is the process's so far: it cannot be reset here)\n");
         std::fflush(stdout);
     }
-    std::printf("peak resident memory: %.1f MB; page of the last step: %.1f MB\n",
-                peakRssKiB() / 1024.0,
+    if (xmllint.isEmpty())
+        std::printf("xmllint not found: no parsing floor (Debian package libxml2-utils)\n");
+    std::printf("peak resident memory of the builds: %.1f MB (with the dialogs: %.1f MB); "
+                "page of the last step: %.1f MB\n",
+                buildsPeakKiB / 1024.0, std::max(runPeakKiB, peakRssKiB()) / 1024.0,
                 fileSize(root + QLatin1String("/step") + QString::number(steps)
                          + QLatin1String("/device_usage_statistics.html")) / 1048576.0);
     return 0;

@@ -97,7 +97,11 @@ int main(int argc, char **argv)
 
     // As the collection cycle: the design name from the file name makes the
     // file's directory the working directory.
-    const QString derived = CrvC_CollectionCycle::designName(QFileInfo(usageFile).absoluteFilePath(), nullptr);
+    bool entered = true;
+    const QString derived =
+        CrvC_CollectionCycle::designName(QFileInfo(usageFile).absoluteFilePath(), nullptr, &entered);
+    if (!entered)
+        return fail(QStringLiteral("cannot enter the folder of %1").arg(usageFile));
     if (!haveDesign)
         design = derived;
 

@@ -1,0 +1,173 @@
+// The host's "VantorUpdate" page, which keeps the proxy choice that the
+// transfers read, and the browser seam of the help manager.
+
+#include "common/TestEnvironment.h"
+
+#include "host/Settings.h"
+#include "host/gui/Dialog.h"
+#include "host/gui/PropSheetEvent.h"
+#include "host/gui/VantorUpdatePage.h"
+
+#include <QLineEdit>
+#include <QRadioButton>
+#include <QtTest>
+
+using namespace Gui::Clip;
+
+namespace {
+
+const char *const keys[] = {"ProxyChoice", "ProxyHost", "ProxyPort"};
+
+// The proxy keys as "<choice>|<host>|<port>", an absent key as "-".
+void store(const QString &values)
+{
+    Settings settings(QStringLiteral("WebUpdate"), true, true, true);
+    const QStringList parts = values.split(QLatin1Char('|'));
+    for (int i = 0; i < 3; ++i) {
+        if (parts.at(i) != QLatin1String("-"))
+            settings.setValue(QString::fromLatin1(keys[i]), parts.at(i));
+    }
+}
+
+// What the transfers read (the group opened as they open it).
+QString stored()
+{
+    const Settings settings(QStringLiteral("WebUpdate"), false, false, true);
+    QStringList values;
+    for (const char *key : keys) {
+        const QString name = QString::fromLatin1(key);
+        values << (settings.contains(name) ? settings.getValue(name).toString() : QStringLiteral("-"));
+    }
+    return values.join(QLatin1Char('|'));
+}
+
+QRadioButton *button(const VantorUpdatePage &page, const QString &choice)
+{
+    return choice == QLatin1String("manual") ? page.manualProxyButton()
+           : choice == QLatin1String("none") ? page.noProxyButton()
+                                              : page.systemProxyButton();
+}
+
+} // namespace
+
+class TestVantorUpdatePage : public QObject
+{
+    Q_OBJECT
+private Q_SLOTS:
+    void initTestCase();
+    void init();
+    void load_data();
+    void load();
+    void apply_data();
+    void apply();
+    void browser_data();
+    void browser();
+
+private:
+    std::unique_ptr<CorvidTest::Environment> m_env;
+};
+
+void TestVantorUpdatePage::initTestCase()
+{
+    m_env.reset(new CorvidTest::Environment);
+}
+
+void TestVantorUpdatePage::init()
+{
+    m_env->clearSettings();
+}
+
+void TestVantorUpdatePage::load_data()
+{
+    QTest::addColumn<QString>("before");
+    QTest::addColumn<QString>("shown"); // "none", "system", "manual"
+
+    QTest::newRow("nothing stored") << "-|-|-" << "system";
+    QTest::newRow("no proxy") << "0|-|-" << "none";
+    QTest::newRow("system") << "1|-|-" << "system";
+    QTest::newRow("manual") << "2|h|8080" << "manual";
+    QTest::newRow("unknown choice") << "7|h|-" << "system";
+    QTest::newRow("not a number") << "abc|-|-" << "system";
+}
+
+void TestVantorUpdatePage::load()
+{
+    QFETCH(QString, before);
+    QFETCH(QString, shown);
+    store(before);
+    VantorUpdatePage page;
+    PropSheetEvent event(PropSheetEvent::ActivatePage);
+    QCoreApplication::sendEvent(&page, &event);
+    QVERIFY(button(page, shown)->isChecked());
+    const bool manual = shown == QLatin1String("manual");
+    QCOMPARE(page.hostEdit()->isEnabled(), manual);
+    QCOMPARE(page.portEdit()->isEnabled(), manual);
+    const QStringList values = before.split(QLatin1Char('|'));
+    QCOMPARE(page.hostEdit()->text(), values.at(1) == QLatin1String("-") ? QString() : values.at(1));
+}
+
+void TestVantorUpdatePage::apply_data()
+{
+    QTest::addColumn<QString>("before");
+    QTest::addColumn<QString>("choice");
+    QTest::addColumn<QString>("host");
+    QTest::addColumn<QString>("port");
+    QTest::addColumn<QString>("after");
+
+    QTest::newRow("manual host and port") << "-|-|-" << "manual" << " proxy.lan " << "3128" << "2|proxy.lan|3128";
+    QTest::newRow("manual without port drops the old port") << "2|old|80" << "manual" << "h" << "" << "2|h|-";
+    QTest::newRow("manual without host") << "2|old|80" << "manual" << " " << "80" << "2|-|80";
+    QTest::newRow("port out of range is not stored") << "-|-|-" << "manual" << "h" << "99999" << "2|h|-";
+    QTest::newRow("no proxy keeps the manual entry") << "2|h|80" << "none" << "x" << "1" << "0|h|80";
+    QTest::newRow("system") << "0|-|-" << "system" << "" << "" << "1|-|-";
+}
+
+void TestVantorUpdatePage::apply()
+{
+    QFETCH(QString, before);
+    QFETCH(QString, choice);
+    QFETCH(QString, host);
+    QFETCH(QString, port);
+    QFETCH(QString, after);
+    store(before);
+    VantorUpdatePage page;
+    page.loadPage();
+    button(page, choice)->setChecked(true);
+    // Only the manual choice stores what the (otherwise disabled) fields hold.
+    page.hostEdit()->setText(host);
+    page.portEdit()->setText(port);
+    PropSheetEvent event(PropSheetEvent::ApplyChanges);
+    QCoreApplication::sendEvent(&page, &event);
+    QCOMPARE(stored(), after);
+}
+
+void TestVantorUpdatePage::browser_data()
+{
+    QTest::addColumn<QString>("address");
+    QTest::addColumn<QString>("opened"); // empty: nothing launched
+    QTest::newRow("web address") << "https://www.vantor.example/corvid" << "https://www.vantor.example/corvid";
+    QTest::newRow("local page") << "/tmp/x/device_usage_statistics.html" << "file:///tmp/x/device_usage_statistics.html";
+    QTest::newRow("empty") << "" << "";
+    QTest::newRow("blank") << "  " << "";
+}
+
+void TestVantorUpdatePage::browser()
+{
+    QFETCH(QString, address);
+    QFETCH(QString, opened);
+    for (const bool answer : {true, false}) {
+        QStringList launched;
+        HelpManager::setLauncher([&](const QUrl &url) {
+            launched << url.toString();
+            return answer;
+        });
+        QCOMPARE(HelpManager::runWebBrowser(address), answer && !opened.isEmpty());
+        QCOMPARE(launched, opened.isEmpty() ? QStringList() : QStringList{opened});
+    }
+    // The offscreen platform launches nothing.
+    HelpManager::setLauncher({});
+    QVERIFY(!HelpManager::runWebBrowser(address));
+}
+
+QTEST_MAIN(TestVantorUpdatePage)
+#include "tst_vantorupdatepage.moc"
