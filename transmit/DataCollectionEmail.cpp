@@ -25,22 +25,17 @@ void CrvC_DataCollectionEmail::send(const QString &tool, const QString &to, cons
     if (words.size() < 2)
         return;
 
-    // The mail program runs on its own; its process object goes when it ends.
-    auto *process = new QProcess;
-    // Connected before the start: a failed start may be reported at once.
-    connect(process, &QProcess::errorOccurred, this, &CrvC_DataCollectionEmail::onProcessError);
-    connect(process, &QProcess::errorOccurred, process, [process](QProcess::ProcessError error) {
-        if (error == QProcess::FailedToStart)
-            process->deleteLater();
-    });
-    connect(process, &QProcess::finished, process, &QObject::deleteLater);
-    // Nobody reads the program's output: it goes where the host's goes.
-    process->setProcessChannelMode(QProcess::ForwardedChannels);
-    process->setStandardInputFile(QProcess::nullDevice());
-    process->start(words.first(), words.mid(1), QIODevice::ReadWrite);
-    // Settles the start here, so that a failure is reported while this object
-    // still exists (callers drop it as soon as send() returns).
-    process->waitForStarted(5000);
+    // The mail program runs detached: it may stay open after the host has
+    // quit, and no process object is left behind for it. Nobody reads its
+    // output: it goes where the host's goes. A failed start is known before
+    // startDetached() returns, while this object still exists (callers drop
+    // it as soon as send() returns).
+    QProcess process;
+    process.setProgram(words.first());
+    process.setArguments(words.mid(1));
+    process.setStandardInputFile(QProcess::nullDevice());
+    if (!process.startDetached())
+        onProcessError(QProcess::FailedToStart);
 }
 
 QStringList CrvC_DataCollectionEmail::commandWords(const QString &command, const QString &argument)
