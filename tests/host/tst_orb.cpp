@@ -42,8 +42,12 @@ void TestOrb::commandLine_data()
     QTest::newRow("usage file reaches the plug-in; collection off: nothing built")
         << QStringList{"open", "top_usage.xml"} << 0
         << "Corvid: open " + m_work + "/top_usage.xml (design \"top\")\nCorvid: collection is switched off";
+    // The open context names the design as "<project>|<design>".
     QTest::newRow("design from the open context")
         << QStringList{"open", "top_usage.xml", "--design", "blinker"} << 0 << "(design \"blinker\")";
+    QTest::newRow("context naming no design") << QStringList{"open", "top_usage.xml", "--design", ""} << 0 << "(design \"\")";
+    QTest::newRow("empty parts of the context dropped")
+        << QStringList{"open", "top_usage.xml", "--design", "|des"} << 0 << "(design \"des\")";
     QTest::newRow("folder that is gone")
         << QStringList{"open", m_work + "/gone/top_usage.xml"} << 0 << "Corvid: cannot enter the folder";
     QTest::newRow("open without file") << QStringList{"open"} << 1 << "open needs a file name";

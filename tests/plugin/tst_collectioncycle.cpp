@@ -31,6 +31,8 @@ private Q_SLOTS:
     void cleanupTestCase();
     void gating_data();
     void gating();
+    void designName_data();
+    void designName();
     void unreachableFolderEndsTheCycle();
 
 private:
@@ -123,6 +125,21 @@ void TestCollectionCycle::gating()
     QCOMPARE(start.projectFile, withProject ? QFileInfo(m_projectFile).absoluteFilePath() : QString());
     QCOMPARE(start.family, withProject ? QStringLiteral("Sparta3") : QString());
     QCOMPARE(QDir::currentPath(), dir);
+}
+
+void TestCollectionCycle::designName_data()
+{
+    // Without an open context; the context's design text is read in orb's tests.
+    QTest::addColumn<QString>("fileName");
+    QTest::addColumn<QString>("expected");
+    QTest::newRow("cut at the last underscore") << "my_top_usage.xml" << "my_top";
+    QTest::newRow("no underscore") << "usage.xml" << "usage";
+}
+
+void TestCollectionCycle::designName()
+{
+    QFETCH(QString, fileName);
+    QTEST(CrvC_CollectionCycle::designName(m_env->home() + QLatin1Char('/') + fileName, nullptr), "expected");
 }
 
 void TestCollectionCycle::unreachableFolderEndsTheCycle()
