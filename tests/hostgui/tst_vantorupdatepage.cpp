@@ -124,18 +124,14 @@ void TestVantorUpdatePage::browser_data()
 void TestVantorUpdatePage::browser()
 {
     QFETCH(QString, address);
-    QFETCH(QString, opened);
-    // Whether the browser started is what the launcher answers.
-    for (const bool answer : {true, false}) {
-        QStringList launched;
-        HelpManager::setLauncher([&](const QUrl &url) {
-            launched << url.toString();
-            return answer;
-        });
-        QCOMPARE(HelpManager::runWebBrowser(address), answer && !opened.isEmpty());
-        QCOMPARE(launched, opened.isEmpty() ? QStringList() : QStringList{opened});
-    }
+    QStringList launched;
+    HelpManager::setLauncher([&](const QUrl &url) {
+        launched << url.toString();
+        return true;
+    });
+    HelpManager::runWebBrowser(address);
     HelpManager::setLauncher({});
+    QTEST(launched.join(QLatin1Char(' ')), "opened");
 }
 
 QTEST_MAIN(TestVantorUpdatePage)
