@@ -12,23 +12,13 @@
 #include <QDir>
 #include <QtTest>
 
-namespace {
-
-struct Start
-{
-    QString how; // "at once" or "countdown"
-    QString projectFile, design, family;
-};
-
-} // namespace
-
 class TestCollectionCycle : public QObject
 {
     Q_OBJECT
 private Q_SLOTS:
     void initTestCase();
     void init();
-    void cleanupTestCase();
+    void cleanupTestCase() { CrvC_CollectionCycle::setDialogs({}); }
     void gating_data();
     void gating();
     void designName_data();
@@ -36,6 +26,11 @@ private Q_SLOTS:
     void unreachableFolderEndsTheCycle();
 
 private:
+    struct Start
+    {
+        QString how; // "at once" or "countdown"
+        QString projectFile, design, family;
+    };
     std::unique_ptr<CorvidTest::Environment> m_env;
     QString m_projectFile;
     QList<Start> m_starts;
@@ -66,11 +61,6 @@ void TestCollectionCycle::init()
     m_env->clearSettings();
     QFile::remove(m_env->installRoot() + QLatin1String("/data/reports/corvidsettings"));
     OrbProject::closeCurrentProject();
-}
-
-void TestCollectionCycle::cleanupTestCase()
-{
-    CrvC_CollectionCycle::setDialogs({});
 }
 
 void TestCollectionCycle::gating_data()

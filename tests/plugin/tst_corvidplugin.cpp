@@ -33,19 +33,13 @@ class TestCorvidPlugin : public QObject
 {
     Q_OBJECT
 private Q_SLOTS:
-    void initTestCase();
+    void initTestCase() { m_env.reset(new CorvidTest::Environment); }
     void loadRegistersAndUnloadUndoes();
     void preferenceSheet();
 
 private:
     std::unique_ptr<CorvidTest::Environment> m_env;
 };
-
-void TestCorvidPlugin::initTestCase()
-{
-    m_env.reset(new CorvidTest::Environment);
-    QVERIFY2(QFile::exists(pluginPath()), qPrintable(pluginPath()));
-}
 
 void TestCorvidPlugin::loadRegistersAndUnloadUndoes()
 {
