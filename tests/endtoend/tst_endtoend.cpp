@@ -15,53 +15,14 @@
 #include "project/ProjectRepositoryValues.h"
 
 #include <QDateTime>
-#include <QDeadlineTimer>
-#include <QElapsedTimer>
 #include <QDirIterator>
+#include <QElapsedTimer>
 #include <QPluginLoader>
 #include <QPushButton>
 #include <QRegularExpression>
 #include <QtTest>
 
 using namespace CorvidTest;
-
-namespace {
-
-const QString pageName = QStringLiteral("device_usage_statistics.html");
-
-bool copyTree(const QString &from, const QString &to)
-{
-    QDir(to).removeRecursively();
-    QDirIterator it(from, QDir::Files, QDirIterator::Subdirectories);
-    while (it.hasNext()) {
-        const QString source = it.next();
-        const QString target = to + source.mid(from.size());
-        QDir().mkpath(QFileInfo(target).absolutePath());
-        if (!QFile::copy(source, target))
-            return false;
-    }
-    return true;
-}
-
-// The send iteration the page showed.
-QString shownIteration(const QByteArray &page)
-{
-    const QRegularExpression tag(QStringLiteral("name=\"ProjectIteration\">([^<]*)<"));
-    return tag.match(QString::fromUtf8(page)).captured(1);
-}
-
-bool waitFor(const std::function<bool()> &done, int ms)
-{
-    QDeadlineTimer deadline(ms);
-    while (!done()) {
-        if (deadline.hasExpired())
-            return false;
-        QTest::qWait(50);
-    }
-    return true;
-}
-
-} // namespace
 
 class TestEndToEnd : public QObject
 {
@@ -75,15 +36,21 @@ private Q_SLOTS:
     void declineSendsNothing();
 
 private:
-    void freshProject();
     ToolRun orb(bool withProject, const QStringList &extraEnvironment = QStringList());
-    QStringList requests();
-    int m_requestsSeen = 0;
+    // The requests the receiver has logged since the test function began.
+    QStringList requests() { return m_server->log().mid(m_logSeen).split(QLatin1Char('\n'), Qt::SkipEmptyParts); }
+    QString sendIteration() const
+    {
+        return ProjectRepositoryValues::instance().getValue(m_projectFile,
+                                                            QLatin1String(ProjectRepositoryValues::SendIterationKey));
+    }
 
     std::unique_ptr<Environment> m_env;
     std::unique_ptr<TestServer> m_server;
-    QString m_project; // the copy of the sample
+    qsizetype m_logSeen = 0;
+    QString m_project; // a fresh copy of the sample for each test
     QString m_projectFile;
+    QString m_page;
 };
 
 void TestEndToEnd::initTestCase()
@@ -99,6 +66,7 @@ void TestEndToEnd::initTestCase()
         qunsetenv(name);
     m_project = m_env->home() + QLatin1String("/ledctrl");
     m_projectFile = m_project + QLatin1String("/ledctrl.orb");
+    m_page = m_project + QLatin1String("/device_usage_statistics.html");
 }
 
 void TestEndToEnd::init()
@@ -107,16 +75,16 @@ void TestEndToEnd::init()
     QFile::remove(m_env->installRoot() + QLatin1String("/data/reports/corvidsettings"));
     // A direct connection, not the desktop's proxy.
     Gui::Clip::Settings(QStringLiteral("WebUpdate"), true, true, true).setValue(QStringLiteral("ProxyChoice"), 0);
-    freshProject();
-    m_requestsSeen = 0;
-    m_requestsSeen = int(requests().size());
-}
-
-void TestEndToEnd::freshProject()
-{
-    QVERIFY(copyTree(Environment::sourceDir() + QLatin1String("/examples/ledctrl"), m_project));
+    const QString sample = Environment::sourceDir() + QLatin1String("/examples/ledctrl");
+    QDir(m_project).removeRecursively();
+    for (QDirIterator it(sample, QDir::Files, QDirIterator::Subdirectories); it.hasNext();) {
+        const QString target = m_project + it.next().mid(sample.size());
+        QDir().mkpath(QFileInfo(target).absolutePath());
+        QVERIFY(QFile::copy(it.filePath(), target));
+    }
     QString error;
     QVERIFY2(OrbProject::initializeRepository(m_projectFile, &error), qPrintable(error));
+    m_logSeen = m_server->log().size();
 }
 
 // orb open on the sample's usage file, with the test's settings (the test
@@ -127,57 +95,48 @@ ToolRun TestEndToEnd::orb(bool withProject, const QStringList &extraEnvironment)
     if (withProject)
         arguments << QStringLiteral("--project") << m_projectFile;
     arguments << QStringLiteral("open") << m_project + QLatin1String("/ledctrl_usage.xml");
-    QStringList environment{QStringLiteral("ORB_DEBUG=1"),
-                            QLatin1String("XDG_CONFIG_HOME=") + QFileInfo(Gui::Clip::Settings::userFileName()).absolutePath().chopped(4)};
-    return runStaged(QStringLiteral("orb"), arguments, m_env->home(), environment + extraEnvironment);
-}
-
-// The requests the receiver has logged since the test function began.
-QStringList TestEndToEnd::requests()
-{
-    QStringList lines = m_server->log().split(QLatin1Char('\n'), Qt::SkipEmptyParts);
-    lines.removeIf([](const QString &line) { return line.startsWith(QLatin1String("listening on")); });
-    return lines.mid(m_requestsSeen);
+    const QString config = QFileInfo(Gui::Clip::Settings::userFileName()).absolutePath().chopped(4);
+    return runStaged(QStringLiteral("orb"), arguments, m_env->home(),
+                     QStringList{QStringLiteral("ORB_DEBUG=1"), QLatin1String("XDG_CONFIG_HOME=") + config}
+                         + extraEnvironment);
 }
 
 void TestEndToEnd::orbOpen_data()
 {
     QTest::addColumn<bool>("withProject");
-    QTest::addColumn<QString>("userCollect"); // "" never applied, else applied now
-    QTest::addColumn<QByteArray>("installFile");
+    QTest::addColumn<QString>("switchedOff"); // "", "by the user", "for the installation"
     QTest::addColumn<bool>("countdown");
     QTest::addColumn<QString>("outcome"); // "sent", or the debug line when nothing is
 
-    const QByteArray off = "collectusagestatistics=false\n";
-    const QString switchedOff = QStringLiteral("collection is switched off");
-    QTest::newRow("sample project, countdown runs out") << true << "" << QByteArray() << true << "sent";
-    QTest::newRow("sample project, sent at once") << true << "" << QByteArray() << false << "sent";
-    QTest::newRow("switched off by the user") << true << "false" << QByteArray() << true << switchedOff;
-    QTest::newRow("switched off by the user, no project") << false << "false" << QByteArray() << false << switchedOff;
-    QTest::newRow("switched off for the installation") << true << "" << off << false << switchedOff;
-    QTest::newRow("switched off for the installation, no project") << false << "" << off << true << switchedOff;
+    const QString user = QStringLiteral("by the user");
+    const QString install = QStringLiteral("for the installation");
+    const QString off = QStringLiteral("collection is switched off");
+    QTest::newRow("sample project, countdown runs out") << true << "" << true << "sent";
+    QTest::newRow("sample project, sent at once") << true << "" << false << "sent";
+    QTest::newRow("switched off by the user") << true << user << true << off;
+    QTest::newRow("switched off by the user, no project") << false << user << false << off;
+    QTest::newRow("switched off for the installation") << true << install << false << off;
+    QTest::newRow("switched off for the installation, no project") << false << install << true << off;
     // A folder in the page's place: no page, so nothing may be sent.
-    QTest::newRow("page cannot be written") << true << "" << QByteArray() << false << "no report written";
+    QTest::newRow("page cannot be written") << true << "" << false << "no report written";
 }
 
 void TestEndToEnd::orbOpen()
 {
     QFETCH(bool, withProject);
-    QFETCH(QString, userCollect);
-    QFETCH(QByteArray, installFile);
+    QFETCH(QString, switchedOff);
     QFETCH(bool, countdown);
     QFETCH(QString, outcome);
-    if (!userCollect.isEmpty()) {
-        CrvC_Settings::setValue(CrvC_Settings::CollectDeviceUsage, userCollect == QLatin1String("true"));
+    if (switchedOff == QLatin1String("by the user")) {
+        CrvC_Settings::setValue(CrvC_Settings::CollectDeviceUsage, false);
         CrvC_Settings::setValue(CrvC_Settings::CorvidTimeStamp, QDateTime::currentDateTime().toString(Qt::ISODate));
+    } else if (!switchedOff.isEmpty()) {
+        QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), "collectusagestatistics=false\n"));
     }
-    if (!installFile.isEmpty())
-        QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), installFile));
     CrvC_Settings::setValue(CrvC_Settings::DontShowSendProgressDlg, !countdown);
-    const QString page = m_project + QLatin1Char('/') + pageName;
     const bool unwritable = outcome == QLatin1String("no report written");
     if (unwritable)
-        QVERIFY(QDir().mkpath(page));
+        QVERIFY(QDir().mkpath(m_page));
     const int uploadsBefore = m_server->uploadFolders().size();
 
     QElapsedTimer clock;
@@ -187,22 +146,21 @@ void TestEndToEnd::orbOpen()
 
     if (outcome != QLatin1String("sent")) {
         QVERIFY2(run.output.contains(outcome), qPrintable(run.output));
-        QCOMPARE(QFileInfo(page).isFile(), false);
-        QCOMPARE(QFileInfo(page).isDir(), unwritable);
+        QVERIFY(!QFileInfo(m_page).isFile());
+        QCOMPARE(QFileInfo(m_page).isDir(), unwritable);
         QCOMPARE(requests(), QStringList());
-        QCOMPARE(m_server->uploadFolders().size(), uploadsBefore);
         return;
     }
     if (countdown)
         QVERIFY2(clock.elapsed() >= 4500, "the countdown takes five seconds");
+    // Byte for byte the page that was built; it showed iteration 1, the next send is the second.
     QCOMPARE(m_server->uploadFolders().size(), uploadsBefore + 1);
-    const QByteArray built = readFile(page);
+    const QByteArray built = readFile(m_page);
     QVERIFY(!built.isEmpty());
     QCOMPARE(m_server->upload(uploadsBefore).file, built);
-    QCOMPARE(shownIteration(built), QStringLiteral("1"));
-    QCOMPARE(ProjectRepositoryValues::instance().getValue(
-                 m_projectFile, QLatin1String(ProjectRepositoryValues::SendIterationKey)),
-             QStringLiteral("2"));
+    const QRegularExpression shown(QStringLiteral("name=\"ProjectIteration\">([^<]*)<"));
+    QCOMPARE(shown.match(QString::fromUtf8(built)).captured(1), QStringLiteral("1"));
+    QCOMPARE(sendIteration(), QStringLiteral("2"));
 }
 
 void TestEndToEnd::emailMethodComposesWithTheReport()
@@ -223,15 +181,12 @@ void TestEndToEnd::emailMethodComposesWithTheReport()
     const ToolRun run = orb(true, {QLatin1String("FAKE_MAIL_LOG=") + log,
                                    QLatin1String("PATH=") + bin + QLatin1Char(':') + qEnvironmentVariable("PATH")});
     QVERIFY2(run.exitCode == 0, qPrintable(run.output));
-    QVERIFY2(waitFor([&] { return QFile::exists(log); }, 10000), qPrintable(run.output));
+    QTRY_VERIFY2_WITH_TIMEOUT(QFile::exists(log), qPrintable(run.output), 10000);
     const QString request = QString::fromUtf8(readFile(log));
     QVERIFY2(request.startsWith(QLatin1String("thunderbird\n-compose\n")), qPrintable(request));
-    QVERIFY2(request.contains(QLatin1String("attachment=file://") + m_project + QLatin1Char('/') + pageName),
-             qPrintable(request));
+    QVERIFY2(request.contains(QLatin1String("attachment=file://") + m_page), qPrintable(request));
     QCOMPARE(requests(), QStringList());
-    QCOMPARE(ProjectRepositoryValues::instance().getValue(
-                 m_projectFile, QLatin1String(ProjectRepositoryValues::SendIterationKey)),
-             QStringLiteral("2"));
+    QCOMPARE(sendIteration(), QStringLiteral("2"));
 }
 
 void TestEndToEnd::declineSendsNothing()
@@ -267,14 +222,12 @@ void TestEndToEnd::declineSendsNothing()
         countdown->findChild<QPushButton *>(QStringLiteral("cancelButton"))->click();
     });
     editors.front()->openFile(Gui::Clip::String::convert(m_project + QLatin1String("/ledctrl_usage.xml")), 0, nullptr);
-    QVERIFY(waitFor([&] { return declined; }, 10000));
+    QTRY_VERIFY_WITH_TIMEOUT(declined, 10000);
     // Well past the countdown: nothing may go out late.
     QTest::qWait(6000);
-    QVERIFY(QFile::exists(m_project + QLatin1Char('/') + pageName));
+    QVERIFY(QFile::exists(m_page));
     QCOMPARE(requests(), QStringList());
-    QCOMPARE(ProjectRepositoryValues::instance().getValue(
-                 m_projectFile, QLatin1String(ProjectRepositoryValues::SendIterationKey)),
-             QString());
+    QCOMPARE(sendIteration(), QString());
     plugin.unload();
     OrbProject::closeCurrentProject();
 }
