@@ -55,8 +55,7 @@ bool writeFile(const QString &path, const QByteArray &contents);
 // Reads a whole file; empty when it cannot be read.
 QByteArray readFile(const QString &path);
 // The text of a piece of the page without its mark-up: tags dropped, white
-// space (and &nbsp;) simplified, "|" (without blanks around it) where a table cell ends. The sample page checks the
-// mark-up; readers' tests compare what the cells say.
+// space (and &nbsp;) simplified, "|" where a table cell ends.
 QString cellText(const QString &html);
 
 } // namespace CorvidTest

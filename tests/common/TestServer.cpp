@@ -130,11 +130,6 @@ bool TestServer::stop()
     return clean;
 }
 
-bool TestServer::isRunning() const
-{
-    return m_process && m_process->state() == QProcess::Running;
-}
-
 QString TestServer::log()
 {
     // The receiver's lines are only collected when waited for.

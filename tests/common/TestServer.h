@@ -15,9 +15,8 @@ namespace CorvidTest {
 class TestCertificates
 {
 public:
-    // Makes the authority and the certificate in `dir`; false (and error())
-    // when openssl fails. `caName` goes into the authority's common name, so
-    // that two authorities can be told apart.
+    // Makes both in `dir`; false (and error()) when openssl fails. `caName`
+    // tells two authorities apart.
     bool create(const QString &dir, const QString &caName = QStringLiteral("Corvid Test CA"));
 
     QString caFile() const { return m_dir + QLatin1String("/ca.crt"); }
@@ -50,13 +49,12 @@ public:
     TestServer(const TestServer &) = delete;
     TestServer &operator=(const TestServer &) = delete;
 
-    // Makes the certificates (first time only) and starts the receiver with
-    // `extraArguments` (e.g. "--no-redirect", "--max-bytes", "100"); waits for
-    // its "listening on" line. False (and error()) when it does not come up.
+    // Makes the certificates (first time only), starts the receiver with
+    // `extraArguments` and waits for its "listening on" line; false (and
+    // error()) when it does not come up.
     bool start(const QStringList &extraArguments = QStringList());
     // SIGTERM, then waits for the receiver to end; true when it ended cleanly.
     bool stop();
-    bool isRunning() const;
 
     // "https://127.0.0.1:PORT", the value for CORVID_SERVER.
     QString baseUrl() const { return m_baseUrl; }

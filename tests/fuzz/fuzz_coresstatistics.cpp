@@ -6,7 +6,6 @@
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t *data, size_t size)
 {
     const QString path = CorvidFuzz::writeInput(QStringLiteral("design_lnkgen.drpt"), data, size);
-    CrvC_CoresStatistics cores;
-    cores.sectionText(path);
+    CrvC_CoresStatistics().sectionText(path);
     return 0;
 }

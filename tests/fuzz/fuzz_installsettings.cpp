@@ -1,28 +1,19 @@
-// The install-wide settings file, found through the installation roots
-// (VANTOR pointed into the private directory), and the collection switch
-// that weighs it against a per-user choice kept there too.
+// The install-wide settings file, found through the installation roots, and
+// the collection switch that weighs it against a per-user choice.
 #include "FuzzInput.h"
 
 #include "project/CorvidSettings.h"
 
-namespace {
-
-bool isolate()
-{
-    const QString dir = CorvidFuzz::workDir();
-    qputenv("VANTOR", (dir + QLatin1String("/root")).toLocal8Bit());
-    qputenv("XDG_CONFIG_HOME", (dir + QLatin1String("/config")).toLocal8Bit());
-    const QByteArray userChoice("[Corvid]\nCorvidTimeStamp=2024-03-01T10:00:00\nCollectDeviceUsage=true\n");
-    CorvidFuzz::writeInput(QStringLiteral("config/orb/orb.ini"),
-                           reinterpret_cast<const uint8_t *>(userChoice.constData()), size_t(userChoice.size()));
-    return true;
-}
-
-} // namespace
-
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t *data, size_t size)
 {
-    static const bool isolated = isolate();
+    static const bool isolated = [] {
+        const QString dir = CorvidFuzz::workDir();
+        qputenv("VANTOR", QFile::encodeName(dir + QLatin1String("/root")));
+        qputenv("XDG_CONFIG_HOME", QFile::encodeName(dir + QLatin1String("/config")));
+        CorvidFuzz::writeInput(QStringLiteral("config/orb/orb.ini"),
+                               "[Corvid]\nCorvidTimeStamp=2024-03-01T10:00:00\nCollectDeviceUsage=true\n");
+        return true;
+    }();
     (void)isolated;
     CorvidFuzz::writeInput(QStringLiteral("root/data/reports/corvidsettings"), data, size);
     QString timestamp;

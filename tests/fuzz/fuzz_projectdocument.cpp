@@ -5,11 +5,6 @@
 
 #include "host/project/ProjectDocument.h"
 
-#include <QFile>
-
-#include <cstdio>
-#include <cstdlib>
-
 namespace {
 
 QByteArray contents(const QString &path)

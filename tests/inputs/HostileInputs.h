@@ -24,27 +24,13 @@ enum class Case {
 
 inline const char *name(Case c)
 {
-    switch (c) {
-    case Case::Fifo: return "named pipe";
-    case Case::DeviceLink: return "link to /dev/zero";
-    case Case::Directory: return "directory";
-    case Case::OverLimit: return "over the limit";
-    case Case::EntityDoubling: return "entity doubling";
-    case Case::NestedContentModel: return "nested content model";
-    }
-    return "?";
+    static const char *const names[] = {"named pipe", "link to /dev/zero", "directory",
+                                        "over the limit", "entity doubling", "nested content model"};
+    return names[int(c)];
 }
 
-// A hostile sample kept for the fuzzers' regression runs.
-inline QString regressionFile(const QString &reader, Case c)
-{
-    return QStringLiteral(CORVID_SOURCE_DIR "/tests/fuzz/regressions/") + reader
-        + (c == Case::EntityDoubling ? QLatin1String("/entity-doubling.xml")
-                                     : QLatin1String("/nested-content-model.xml"));
-}
-
-// Plants case `c` at `path`; `reader` names the regression folder of the DTD
-// samples. False when it could not be made.
+// Plants case `c` at `path`; `reader` names the fuzzers' regression folder
+// that holds the DTD samples. False when it could not be made.
 inline bool plant(const QString &path, Case c, Port::InputFile::Kind kind,
                   const QString &reader = QString())
 {
@@ -64,7 +50,10 @@ inline bool plant(const QString &path, Case c, Port::InputFile::Kind kind,
     }
     case Case::EntityDoubling:
     case Case::NestedContentModel:
-        return QFile::copy(regressionFile(reader, c), path);
+        return QFile::copy(QStringLiteral(CORVID_SOURCE_DIR "/tests/fuzz/regressions/") + reader
+                               + (c == Case::EntityDoubling ? QLatin1String("/entity-doubling.xml")
+                                                            : QLatin1String("/nested-content-model.xml")),
+                           path);
     }
     return false;
 }

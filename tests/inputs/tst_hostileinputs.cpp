@@ -43,23 +43,11 @@ QString joined(const QStringList &list)
     return list.join(QLatin1Char('|'));
 }
 
-// What the install-wide settings file holds, read the only way the plug-in
-// reads it: from the first installation root.
-QString installSettings()
-{
-    QString timestamp;
-    bool collect = true;
-    CrvC_Settings::readInstallSettings(timestamp, collect);
-    return QString::number(collect) + timestamp;
-}
-
-const QByteArray ExternalDtd = "<!DOCTYPE %1 SYSTEM \"http://127.0.0.1:9/none.dtd\">\n";
-
+// `xml` behind a document type line naming an external DTD.
 QByteArray withDoctype(const char *root, const QByteArray &xml)
 {
-    QByteArray doctype = ExternalDtd;
-    doctype.replace("%1", root);
-    return QByteArray("<?xml version=\"1.0\"?>\n") + doctype + xml;
+    return QByteArray("<?xml version=\"1.0\"?>\n<!DOCTYPE ") + root
+           + " SYSTEM \"http://127.0.0.1:9/none.dtd\">\n" + xml;
 }
 
 QList<Reader> readers()
@@ -110,7 +98,7 @@ QList<Reader> readers()
          }},
         {"netlist-build report", InputFile::CoreReport, "coresstatistics", cores,
          withDoctype("document", cores),
-         [](const QString &path) -> QString { return CrvC_CoresStatistics().sectionText(path); }},
+         [](const QString &path) { return CrvC_CoresStatistics().sectionText(path); }},
         {"help viewer data", InputFile::HelpViewerData, "helpviewerdata", help,
          withDoctype("OrbHelpViewerData", help),
          [](const QString &path) -> QString {
@@ -118,7 +106,7 @@ QList<Reader> readers()
                                                                 : QStringLiteral("wrong path");
          }},
         {"sub-report page", InputFile::SubReport, nullptr, "<P>a</P>\n<P>b</P>\n", {},
-         [](const QString &path) -> QString { return CrvC_RunStatistics::parUsageSection(path); }},
+         [](const QString &path) { return CrvC_RunStatistics::parUsageSection(path); }},
         {"run records", InputFile::RunRecords, nullptr,
          "synth 2026-01-01T10:00:00 12 completed\n", {},
          [](const QString &path) -> QString {
@@ -127,7 +115,13 @@ QList<Reader> readers()
          }},
         {"install-wide settings", InputFile::InstallSettings, nullptr,
          "collectusagestatistics=false\ntimestamp=2026-01-01T00:00:00\n", {},
-         [](const QString &) -> QString { return installSettings(); }},
+         [](const QString &) -> QString {
+             // read the only way the plug-in reads it: from the first installation root
+             QString timestamp;
+             bool collect = true;
+             CrvC_Settings::readInstallSettings(timestamp, collect);
+             return QString::number(collect) + timestamp;
+         }},
         {"project file", InputFile::ProjectFile, "projectdocument", project,
          withDoctype("project", project),
          [](const QString &path) -> QString {

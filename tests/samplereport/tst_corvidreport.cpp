@@ -37,7 +37,6 @@ void TestCorvidReport::commandLine_data()
     QTest::addColumn<QString>("expectedPage"); // a page that must exist afterwards
 
     const QString page = m_work + QLatin1String("/device_usage_statistics.html");
-    QTest::newRow("help") << QStringList{"--help"} << 0 << "USAGE_XML" << QString();
     QTest::newRow("no usage file") << QStringList{} << 1 << "no usage file given" << QString();
     QTest::newRow("page beside the usage file")
         << QStringList{"top_usage.xml"} << 0 << page << page;
