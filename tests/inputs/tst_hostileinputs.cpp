@@ -139,120 +139,111 @@ QList<Reader> readers()
 class tst_HostileInputs : public QObject
 {
     Q_OBJECT
-
-private Q_SLOTS:
-    void initTestCase();
-    void reader_data();
-    void reader();
-    void wholePage();
-
-private:
-    QString inputPath(const Reader &reader) const;
-
     std::unique_ptr<CorvidTest::Environment> m_env;
     QTemporaryDir m_dir;
-};
 
-void tst_HostileInputs::initTestCase()
-{
-    m_env.reset(new CorvidTest::Environment);
-    QVERIFY(m_dir.isValid());
-    qputenv("APPDATA", QFile::encodeName(m_dir.filePath(QStringLiteral("appdata"))));
-}
-
-QString tst_HostileInputs::inputPath(const Reader &reader) const
-{
-    if (reader.kind == InputFile::HelpViewerData)
-        return CrvC_HelpViewerData::helpFilePath();
-    if (reader.kind == InputFile::InstallSettings)
-        return m_env->installRoot() + QLatin1String("/data/reports/corvidsettings");
-    return m_dir.filePath(QString::fromLatin1(reader.name).replace(QLatin1Char(' '), QLatin1Char('_')));
-}
-
-void tst_HostileInputs::reader_data()
-{
-    QTest::addColumn<int>("index");
-    QTest::addColumn<QString>("setup"); // "external DTD", or a hostile case
-    QTest::addColumn<HostileInputs::Case>("hostile");
-
-    const QList<Reader> all = readers();
-    for (int i = 0; i < all.size(); ++i) {
-        QList<Case> cases = {Case::Fifo, Case::DeviceLink, Case::Directory};
-        // The fuse log is never read, so its size does not matter.
-        if (all.at(i).kind != InputFile::FuseLog)
-            cases << Case::OverLimit;
-        if (all.at(i).regressions) {
-            cases << Case::EntityDoubling << Case::NestedContentModel;
-            QTest::addRow("%s: external DTD", all.at(i).name) << i << "external DTD" << Case::Fifo;
-        }
-        for (Case c : cases)
-            QTest::addRow("%s: %s", all.at(i).name, HostileInputs::name(c)) << i << QString() << c;
+    QString inputPath(const Reader &reader) const
+    {
+        if (reader.kind == InputFile::HelpViewerData)
+            return CrvC_HelpViewerData::helpFilePath();
+        if (reader.kind == InputFile::InstallSettings)
+            return m_env->installRoot() + QLatin1String("/data/reports/corvidsettings");
+        return m_dir.filePath(QString::fromLatin1(reader.name).replace(QLatin1Char(' '), QLatin1Char('_')));
     }
-}
 
-// A hostile input reads as a missing one, at once; a document type line
-// naming an external DTD reads as the same document without it.
-void tst_HostileInputs::reader()
-{
-    QFETCH(int, index);
-    QFETCH(QString, setup);
-    QFETCH(HostileInputs::Case, hostile);
-    const Reader reader = readers().at(index);
-    const QString path = inputPath(reader);
+private Q_SLOTS:
+    void initTestCase()
+    {
+        m_env.reset(new CorvidTest::Environment);
+        QVERIFY(m_dir.isValid());
+        qputenv("APPDATA", QFile::encodeName(m_dir.filePath(QStringLiteral("appdata"))));
+    }
 
-    QFile::remove(path);
-    QDir(path).removeRecursively();
-    const QString missing = reader.read(path);
-    QVERIFY(CorvidTest::writeFile(path, reader.sample));
-    const QString plain = reader.read(path);
-    QVERIFY2(plain != missing, "the sample must give a result of its own");
-    QVERIFY(QFile::remove(path));
+    void reader_data()
+    {
+        QTest::addColumn<int>("index");
+        QTest::addColumn<QString>("setup"); // "external DTD", or a hostile case
+        QTest::addColumn<HostileInputs::Case>("hostile");
 
-    if (setup == QLatin1String("external DTD")) {
-        QVERIFY(CorvidTest::writeFile(path, reader.doctype));
-        QCOMPARE(reader.read(path), plain);
-    } else {
-        QVERIFY(HostileInputs::plant(path, hostile, reader.kind,
-                                     QString::fromLatin1(reader.regressions)));
+        const QList<Reader> all = readers();
+        for (int i = 0; i < all.size(); ++i) {
+            QList<Case> cases = {Case::Fifo, Case::DeviceLink, Case::Directory};
+            // The fuse log is never read, so its size does not matter.
+            if (all.at(i).kind != InputFile::FuseLog)
+                cases << Case::OverLimit;
+            if (all.at(i).regressions) {
+                cases << Case::EntityDoubling << Case::NestedContentModel;
+                QTest::addRow("%s: external DTD", all.at(i).name) << i << "external DTD" << Case::Fifo;
+            }
+            for (Case c : cases)
+                QTest::addRow("%s: %s", all.at(i).name, HostileInputs::name(c)) << i << QString() << c;
+        }
+    }
+
+    // A hostile input reads as a missing one, at once; a document type line
+    // naming an external DTD reads as the same document without it.
+    void reader()
+    {
+        QFETCH(int, index);
+        QFETCH(QString, setup);
+        QFETCH(HostileInputs::Case, hostile);
+        const Reader reader = readers().at(index);
+        const QString path = inputPath(reader);
+
+        QFile::remove(path);
+        QDir(path).removeRecursively();
+        const QString missing = reader.read(path);
+        QVERIFY(CorvidTest::writeFile(path, reader.sample));
+        const QString plain = reader.read(path);
+        QVERIFY2(plain != missing, "the sample must give a result of its own");
+        QVERIFY(QFile::remove(path));
+
+        if (setup == QLatin1String("external DTD")) {
+            QVERIFY(CorvidTest::writeFile(path, reader.doctype));
+            QCOMPARE(reader.read(path), plain);
+        } else {
+            QVERIFY(HostileInputs::plant(path, hostile, reader.kind,
+                                         QString::fromLatin1(reader.regressions)));
+            QElapsedTimer timer;
+            timer.start();
+            QCOMPARE(reader.read(path), missing);
+            QVERIFY2(timer.elapsed() < 5000, qPrintable(QString::number(timer.elapsed())));
+        }
+        QFile::remove(path);
+        QDir(path).removeRecursively();
+    }
+
+    // Every input of the page replaced by a named pipe at once: the page is
+    // still built, and quickly.
+    void wholePage()
+    {
+        const QString project = m_dir.filePath(QStringLiteral("project"));
+        QVERIFY(QDir().mkpath(project + QLatin1String("/osim")));
+        const QString previous = QDir::currentPath();
+        QVERIFY(QDir::setCurrent(project));
+        const char *const inputs[] = {"top.snx", "top_map.ktp", "top_usage.xml", "top.cmd_log",
+                                      "fuse.log", "top_lnkgen.drpt", "par_usage_statistics.html",
+                                      "osim/osim_usage_statistics.html"};
+        for (const char *input : inputs)
+            QVERIFY(HostileInputs::plant(project + QLatin1Char('/') + QLatin1String(input), Case::Fifo,
+                                         InputFile::UsageXml));
+        QVERIFY(HostileInputs::plant(CrvC_HelpViewerData::helpFilePath(), Case::Fifo,
+                                     InputFile::HelpViewerData));
+
         QElapsedTimer timer;
         timer.start();
-        QCOMPARE(reader.read(path), missing);
-        QVERIFY2(timer.elapsed() < 5000, qPrintable(QString::number(timer.elapsed())));
+        CrvC_ReportBuilder builder;
+        builder.createReport(QStringLiteral("top"), QStringLiteral("top"), QStringLiteral("Xc6"));
+        const qint64 elapsed = timer.elapsed();
+        QDir::setCurrent(previous);
+        QFile::remove(CrvC_HelpViewerData::helpFilePath());
+
+        QVERIFY(builder.pageText().endsWith(QLatin1String("</BODY></HTML>")));
+        QVERIFY(builder.pageText().contains(QLatin1String("Device Usage Statistics</B>")));
+        QVERIFY(!builder.pageText().contains(QLatin1String("Tool Usage")));
+        QVERIFY2(elapsed < 10000, qPrintable(QString::number(elapsed)));
     }
-    QFile::remove(path);
-    QDir(path).removeRecursively();
-}
-
-// Every input of the page replaced by a named pipe at once: the page is
-// still built, and quickly.
-void tst_HostileInputs::wholePage()
-{
-    const QString project = m_dir.filePath(QStringLiteral("project"));
-    QVERIFY(QDir().mkpath(project + QLatin1String("/osim")));
-    const QString previous = QDir::currentPath();
-    QVERIFY(QDir::setCurrent(project));
-    const char *const inputs[] = {"top.snx", "top_map.ktp", "top_usage.xml", "top.cmd_log",
-                                  "fuse.log", "top_lnkgen.drpt", "par_usage_statistics.html",
-                                  "osim/osim_usage_statistics.html"};
-    for (const char *input : inputs)
-        QVERIFY(HostileInputs::plant(project + QLatin1Char('/') + QLatin1String(input), Case::Fifo,
-                                     InputFile::UsageXml));
-    QVERIFY(HostileInputs::plant(CrvC_HelpViewerData::helpFilePath(), Case::Fifo,
-                                 InputFile::HelpViewerData));
-
-    QElapsedTimer timer;
-    timer.start();
-    CrvC_ReportBuilder builder;
-    builder.createReport(QStringLiteral("top"), QStringLiteral("top"), QStringLiteral("Xc6"));
-    const qint64 elapsed = timer.elapsed();
-    QDir::setCurrent(previous);
-    QFile::remove(CrvC_HelpViewerData::helpFilePath());
-
-    QVERIFY(builder.pageText().endsWith(QLatin1String("</BODY></HTML>")));
-    QVERIFY(builder.pageText().contains(QLatin1String("Device Usage Statistics</B>")));
-    QVERIFY(!builder.pageText().contains(QLatin1String("Tool Usage")));
-    QVERIFY2(elapsed < 10000, qPrintable(QString::number(elapsed)));
-}
+};
 
 QTEST_GUILESS_MAIN(tst_HostileInputs)
 #include "tst_hostileinputs.moc"

@@ -38,99 +38,91 @@ bool copyTree(const QString &from, const QString &to)
 class TestSampleReport : public QObject
 {
     Q_OBJECT
-private Q_SLOTS:
-    void initTestCase();
-    void samplePage();
-    void secondReportKeepsIdentifiersAndCountsSends();
-
-private:
-    CrvC_ReportBuilder::Environment seams() const;
-    QString build(CrvC_ReportBuilder &builder) const;
-
     std::unique_ptr<CorvidTest::Environment> m_env;
     QString m_projectFile;
-};
 
-void TestSampleReport::initTestCase()
-{
-    m_env.reset(new CorvidTest::Environment);
-    QVERIFY(m_env->writeDataFile(QStringLiteral("orb_version"),
-                                 "product=Orb Design Suite\nversion=14.7\n"
-                                 "Registration_ID=ORB-EVAL-0000\nconfiguration.xc6=Professional\n"));
-    CrvC_Settings::setValue(CrvC_Settings::RandomID, QStringLiteral("5eed0000000000000000000000000001"));
-
-    const QString project = m_env->home() + QLatin1String("/ledctrl");
-    QVERIFY(copyTree(CorvidTest::Environment::sourceDir() + QLatin1String("/examples/ledctrl"), project));
-    const QString helpFile = CrvC_HelpViewerData::helpFilePath();
-    QDir().mkpath(QFileInfo(helpFile).absolutePath());
-    QVERIFY(QFile::copy(CorvidTest::Environment::sourceDir()
-                            + QLatin1String("/examples/helpviewer/orbhelpviewerdata.xml"),
-                        helpFile));
-
-    m_projectFile = project + QLatin1String("/ledctrl.orb");
-    QString error;
-    QVERIFY2(RepositoryAccess::write(m_projectFile, QLatin1String(RepositoryAccess::CreationSection),
-                                     QLatin1String(RepositoryAccess::CreationSubSection),
-                                     QLatin1String(RepositoryAccess::CreationKey),
-                                     QStringLiteral("2026-03-01T09:30:00"), &error),
-             qPrintable(error));
-    QVERIFY2(OrbProject::openCurrentProject(m_projectFile, &error), qPrintable(error));
-}
-
-CrvC_ReportBuilder::Environment TestSampleReport::seams() const
-{
-    CrvC_ReportBuilder::Environment env;
-    env.now = [] { return QDateTime(QDate(2026, 3, 17), QTime(14, 5, 9)); };
-    env.newIdentifier = [] { return QStringLiteral("9a0be000000000000000000000000002"); };
-    return env;
-}
-
-QString TestSampleReport::build(CrvC_ReportBuilder &builder) const
-{
-    QString projectFile, family;
-    CrvC_CollectionCycle::currentProject(projectFile, family);
-    builder.createReport(projectFile, QStringLiteral("ledctrl"), family);
-    return builder.pageText();
-}
-
-void TestSampleReport::samplePage()
-{
-    CrvC_ReportBuilder builder(seams());
-    const QByteArray page = build(builder).toUtf8();
-    QCOMPARE(CorvidTest::readFile(QFileInfo(m_projectFile).absolutePath()
-                                  + QLatin1String("/device_usage_statistics.html")),
-             page);
-
-    if (qEnvironmentVariableIsSet("CORVID_UPDATE_GOLDEN"))
-        QVERIFY(CorvidTest::writeFile(QString::fromUtf8(goldenPage), page));
-    const QByteArray golden = CorvidTest::readFile(QString::fromUtf8(goldenPage));
-    QVERIFY2(!golden.isEmpty(), goldenPage);
-    if (page != golden) {
-        // Name the first differing line rather than dumping two whole pages.
-        const QList<QByteArray> got = page.split('\n');
-        const QList<QByteArray> want = golden.split('\n');
-        for (int i = 0; i < qMin(got.size(), want.size()); ++i)
-            QCOMPARE(QString::fromUtf8(got.at(i)), QString::fromUtf8(want.at(i)));
-        QCOMPARE(got.size(), want.size());
+    CrvC_ReportBuilder::Environment seams() const
+    {
+        CrvC_ReportBuilder::Environment env;
+        env.now = [] { return QDateTime(QDate(2026, 3, 17), QTime(14, 5, 9)); };
+        env.newIdentifier = [] { return QStringLiteral("9a0be000000000000000000000000002"); };
+        return env;
     }
-}
 
-// A second report keeps the project's identifier and shows the send counted
-// after the first.
-void TestSampleReport::secondReportKeepsIdentifiersAndCountsSends()
-{
-    CrvC_ReportBuilder first(seams());
-    build(first);
-    QCOMPARE(first.projectIteration(), QStringLiteral("1"));
-    ProjectRepositoryValues::instance().countSend(m_projectFile, first.projectIteration());
+    QString build(CrvC_ReportBuilder &builder) const
+    {
+        QString projectFile, family;
+        CrvC_CollectionCycle::currentProject(projectFile, family);
+        builder.createReport(projectFile, QStringLiteral("ledctrl"), family);
+        return builder.pageText();
+    }
 
-    CrvC_ReportBuilder::Environment other = seams();
-    other.newIdentifier = [] { return QStringLiteral("ffffffffffffffffffffffffffffffff"); };
-    CrvC_ReportBuilder second(other);
-    const QString page = build(second);
-    QVERIFY(page.contains(QLatin1String("<dtag-property name=\"ProjectID\">9a0be000000000000000000000000002")));
-    QVERIFY(page.contains(QLatin1String("<dtag-property name=\"ProjectIteration\">2</dtag-property>")));
-}
+private Q_SLOTS:
+    void initTestCase()
+    {
+        m_env.reset(new CorvidTest::Environment);
+        QVERIFY(m_env->writeDataFile(QStringLiteral("orb_version"),
+                                     "product=Orb Design Suite\nversion=14.7\n"
+                                     "Registration_ID=ORB-EVAL-0000\nconfiguration.xc6=Professional\n"));
+        CrvC_Settings::setValue(CrvC_Settings::RandomID, QStringLiteral("5eed0000000000000000000000000001"));
+
+        const QString project = m_env->home() + QLatin1String("/ledctrl");
+        QVERIFY(copyTree(CorvidTest::Environment::sourceDir() + QLatin1String("/examples/ledctrl"), project));
+        const QString helpFile = CrvC_HelpViewerData::helpFilePath();
+        QDir().mkpath(QFileInfo(helpFile).absolutePath());
+        QVERIFY(QFile::copy(CorvidTest::Environment::sourceDir()
+                                + QLatin1String("/examples/helpviewer/orbhelpviewerdata.xml"),
+                            helpFile));
+
+        m_projectFile = project + QLatin1String("/ledctrl.orb");
+        QString error;
+        QVERIFY2(RepositoryAccess::write(m_projectFile, QLatin1String(RepositoryAccess::CreationSection),
+                                         QLatin1String(RepositoryAccess::CreationSubSection),
+                                         QLatin1String(RepositoryAccess::CreationKey),
+                                         QStringLiteral("2026-03-01T09:30:00"), &error),
+                 qPrintable(error));
+        QVERIFY2(OrbProject::openCurrentProject(m_projectFile, &error), qPrintable(error));
+    }
+
+    void samplePage()
+    {
+        CrvC_ReportBuilder builder(seams());
+        const QByteArray page = build(builder).toUtf8();
+        QCOMPARE(CorvidTest::readFile(QFileInfo(m_projectFile).absolutePath()
+                                      + QLatin1String("/device_usage_statistics.html")),
+                 page);
+
+        if (qEnvironmentVariableIsSet("CORVID_UPDATE_GOLDEN"))
+            QVERIFY(CorvidTest::writeFile(QString::fromUtf8(goldenPage), page));
+        const QByteArray golden = CorvidTest::readFile(QString::fromUtf8(goldenPage));
+        QVERIFY2(!golden.isEmpty(), goldenPage);
+        if (page != golden) {
+            // Name the first differing line rather than dumping two whole pages.
+            const QList<QByteArray> got = page.split('\n');
+            const QList<QByteArray> want = golden.split('\n');
+            for (int i = 0; i < qMin(got.size(), want.size()); ++i)
+                QCOMPARE(QString::fromUtf8(got.at(i)), QString::fromUtf8(want.at(i)));
+            QCOMPARE(got.size(), want.size());
+        }
+    }
+
+    // A second report keeps the project's identifier and shows the send counted
+    // after the first.
+    void secondReportKeepsIdentifiersAndCountsSends()
+    {
+        CrvC_ReportBuilder first(seams());
+        build(first);
+        QCOMPARE(first.projectIteration(), QStringLiteral("1"));
+        ProjectRepositoryValues::instance().countSend(m_projectFile, first.projectIteration());
+
+        CrvC_ReportBuilder::Environment other = seams();
+        other.newIdentifier = [] { return QStringLiteral("ffffffffffffffffffffffffffffffff"); };
+        CrvC_ReportBuilder second(other);
+        const QString page = build(second);
+        QVERIFY(page.contains(QLatin1String("<dtag-property name=\"ProjectID\">9a0be000000000000000000000000002")));
+        QVERIFY(page.contains(QLatin1String("<dtag-property name=\"ProjectIteration\">2</dtag-property>")));
+    }
+};
 
 QTEST_GUILESS_MAIN(TestSampleReport)
 #include "tst_samplereport.moc"
