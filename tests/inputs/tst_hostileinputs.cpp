@@ -26,111 +26,94 @@ Q_DECLARE_METATYPE(HostileInputs::Case)
 
 namespace {
 
-// One reader: where its input goes, a small well-formed input, and what it
-// made of the file, as text to compare.
+// One reader: its kind, a small well-formed input, and what it made of the
+// file, as text to compare. XML readers name their root element and the
+// fuzzers' regression folder that holds their DTD samples.
 struct Reader
 {
     const char *name;
     InputFile::Kind kind;
-    const char *regressions; // folder of its DTD samples; null for text inputs
     QByteArray sample;
-    QByteArray doctype; // the sample with a document type line naming an external DTD
     std::function<QString(const QString &path)> read;
+    const char *root = nullptr;
+    const char *regressions = nullptr;
 };
 
-QString joined(const QStringList &list)
+// A reader that fills report data, and what it filled.
+template <typename Fill, typename Show>
+std::function<QString(const QString &)> filling(Fill fill, Show show)
 {
-    return list.join(QLatin1Char('|'));
+    return [fill, show](const QString &path) {
+        CrvC_ReportData data;
+        fill(path, data);
+        return QString(show(data));
+    };
 }
 
-// `xml` behind a document type line naming an external DTD.
-QByteArray withDoctype(const char *root, const QByteArray &xml)
+QString history(const CrvC_ReportData &data)
 {
-    return QByteArray("<?xml version=\"1.0\"?>\n<!DOCTYPE ") + root
-           + " SYSTEM \"http://127.0.0.1:9/none.dtd\">\n" + xml;
+    return data.commandHistory.join(QLatin1Char('|'));
 }
 
 QList<Reader> readers()
 {
-    const QByteArray usage = "<DeviceUsageReport><DeviceUsage><group name='Slices'>"
-                             "<item name='Used' value='12'/></group></DeviceUsage>"
-                             "</DeviceUsageReport>";
-    const QByteArray cores = "<document><scope stringID='LNKGEN_CORE_INSTANCE'>"
-                             "<item stringID='LNKGEN_CORE_INFO' type='counter' depth='4'/>"
-                             "</scope></document>";
-    const QByteArray help = "<OrbHelpViewerData><SearchString found='true' count='3'>fifo"
-                            "</SearchString></OrbHelpViewerData>";
-    const QByteArray project = "<project name='p'><sources><file path='a.vhd'/></sources>"
-                               "</project>";
     return {
-        {"map report", InputFile::MapReport, nullptr,
-         "Target Device : xc3s500e\nTarget Package : fg320\nTarget Speed : -4\n", {},
-         [](const QString &path) -> QString {
-             CrvC_ReportData data;
-             CrvC_SynthesisReport::readTargetInfo(path, data);
+        {"map report", InputFile::MapReport,
+         "Target Device : xc3s500e\nTarget Package : fg320\nTarget Speed : -4\n",
+         filling(CrvC_SynthesisReport::readTargetInfo, [](const CrvC_ReportData &data) -> QString {
              return data.targetDevice + data.targetPackage + data.targetSpeed;
-         }},
-        {"synthesis report", InputFile::SynthesisReport, nullptr,
-         "Advanced HDL Synthesis Report\n# RAMs : 1\n 16x8-bit RAM : 1\n================\n", {},
-         [](const QString &path) -> QString {
-             CrvC_ReportData data;
-             CrvC_SynthesisReport::readMacroStatistics(path, data);
-             return CrvC_SynthesisReport::macroStatisticsCell(data);
-         }},
-        {"usage XML", InputFile::UsageXml, "usagexml", usage,
-         withDoctype("DeviceUsageReport", usage),
+         })},
+        {"synthesis report", InputFile::SynthesisReport,
+         "Advanced HDL Synthesis Report\n# RAMs : 1\n 16x8-bit RAM : 1\n================\n",
+         filling(CrvC_SynthesisReport::readMacroStatistics, CrvC_SynthesisReport::macroStatisticsCell)},
+        {"usage XML", InputFile::UsageXml,
+         "<DeviceUsageReport><DeviceUsage><group name='Slices'><item name='Used' value='12'/>"
+         "</group></DeviceUsage></DeviceUsageReport>",
          [](const QString &path) -> QString {
              CrvC_ReportData data;
              const bool read = CrvC_UsageXml::readUsageXml(path, data);
-             return QString::number(read) + joined(data.deviceUsage.keys());
-         }},
-        {"command log", InputFile::CommandLog, nullptr, "par -w top\n", {},
-         [](const QString &path) -> QString {
-             CrvC_ReportData data;
-             CrvC_CommandLog::readCommandLog(path, data);
-             return joined(data.commandHistory);
-         }},
-        {"fuse log", InputFile::FuseLog, nullptr, "", {},
-         [](const QString &path) -> QString {
-             CrvC_ReportData data;
-             CrvC_CommandLog::checkFuseLog(path, data);
-             return joined(data.commandHistory);
-         }},
-        {"netlist-build report", InputFile::CoreReport, "coresstatistics", cores,
-         withDoctype("document", cores),
-         [](const QString &path) { return CrvC_CoresStatistics().sectionText(path); }},
-        {"help viewer data", InputFile::HelpViewerData, "helpviewerdata", help,
-         withDoctype("OrbHelpViewerData", help),
+             return QString::number(read) + data.deviceUsage.keys().join(QLatin1Char('|'));
+         },
+         "DeviceUsageReport", "usagexml"},
+        {"command log", InputFile::CommandLog, "par -w top\n", filling(CrvC_CommandLog::readCommandLog, history)},
+        {"fuse log", InputFile::FuseLog, "", filling(CrvC_CommandLog::checkFuseLog, history)},
+        {"netlist-build report", InputFile::CoreReport,
+         "<document><scope stringID='LNKGEN_CORE_INSTANCE'>"
+         "<item stringID='LNKGEN_CORE_INFO' type='counter' depth='4'/></scope></document>",
+         [](const QString &path) { return CrvC_CoresStatistics().sectionText(path); },
+         "document", "coresstatistics"},
+        {"help viewer data", InputFile::HelpViewerData,
+         "<OrbHelpViewerData><SearchString found='true' count='3'>fifo</SearchString></OrbHelpViewerData>",
          [](const QString &path) -> QString {
              return path == CrvC_HelpViewerData::helpFilePath() ? CrvC_HelpViewerData().sectionText()
                                                                 : QStringLiteral("wrong path");
-         }},
-        {"sub-report page", InputFile::SubReport, nullptr, "<P>a</P>\n<P>b</P>\n", {},
+         },
+         "OrbHelpViewerData", "helpviewerdata"},
+        {"sub-report page", InputFile::SubReport, "<P>a</P>\n<P>b</P>\n",
          [](const QString &path) { return CrvC_RunStatistics::parUsageSection(path); }},
-        {"run records", InputFile::RunRecords, nullptr,
-         "synth 2026-01-01T10:00:00 12 completed\n", {},
+        {"run records", InputFile::RunRecords, "synth 2026-01-01T10:00:00 12 completed\n",
          [](const QString &path) -> QString {
              UtilC::RunRecords records;
              return QString::number(records.read(path)) + records.htmlTable();
          }},
-        {"install-wide settings", InputFile::InstallSettings, nullptr,
-         "collectusagestatistics=false\ntimestamp=2026-01-01T00:00:00\n", {},
+        // Read the only way the plug-in reads it: from the first installation root.
+        {"install-wide settings", InputFile::InstallSettings,
+         "collectusagestatistics=false\ntimestamp=2026-01-01T00:00:00\n",
          [](const QString &) -> QString {
-             // read the only way the plug-in reads it: from the first installation root
              QString timestamp;
              bool collect = true;
              CrvC_Settings::readInstallSettings(timestamp, collect);
              return QString::number(collect) + timestamp;
          }},
-        {"project file", InputFile::ProjectFile, "projectdocument", project,
-         withDoctype("project", project),
+        {"project file", InputFile::ProjectFile,
+         "<project name='p'><sources><file path='a.vhd'/></sources></project>",
          [](const QString &path) -> QString {
              OrbProject::ProjectDocument document;
              QString error;
-             return document.read(path, &error)
-                 ? document.name + QString::number(document.sources.size())
-                 : QStringLiteral("refused");
-         }},
+             return document.read(path, &error) ? document.name + QString::number(document.sources.size())
+                                                : QStringLiteral("refused");
+         },
+         "project", "projectdocument"},
     };
 }
 
@@ -199,7 +182,8 @@ private Q_SLOTS:
         QVERIFY(QFile::remove(path));
 
         if (setup == QLatin1String("external DTD")) {
-            QVERIFY(CorvidTest::writeFile(path, reader.doctype));
+            QVERIFY(CorvidTest::writeFile(path, "<?xml version=\"1.0\"?>\n<!DOCTYPE " + QByteArray(reader.root)
+                                                + " SYSTEM \"http://127.0.0.1:9/none.dtd\">\n" + reader.sample));
             QCOMPARE(reader.read(path), plain);
         } else {
             QVERIFY(HostileInputs::plant(path, hostile, reader.kind,
