@@ -3,12 +3,11 @@
 // Shared by the fuzz harnesses (one translation unit each). Every reader under
 // test takes a path, so each input goes to a file in a private temporary
 // directory, removed at exit. Without libFuzzer, main() below runs each file
-// named on the command line (folders: every file in them) through the
-// harness once, so the seeds and regression cases are checked in every build.
+// named on the command line through the harness once (run-inputs.sh names
+// the seeds and regression cases), so they are checked in every build.
 
 #include <QCoreApplication>
 #include <QDir>
-#include <QDirIterator>
 #include <QFile>
 #include <QFileInfo>
 #include <QTemporaryDir>
@@ -63,26 +62,17 @@ inline QString writeInput(const QString &relativePath, const QByteArray &bytes)
 #ifdef CORVID_FUZZ_STANDALONE
 int main(int argc, char **argv)
 {
-    QStringList files;
     for (int i = 1; i < argc; ++i) {
-        const QString arg = QString::fromLocal8Bit(argv[i]);
-        for (QDirIterator it(arg, QDir::Files | QDir::Hidden | QDir::NoSymLinks, QDirIterator::Subdirectories);
-             it.hasNext();)
-            files << it.next();
-        if (!QFileInfo(arg).isDir())
-            files << arg;
-    }
-    for (const QString &path : files) {
-        QFile file(path);
+        QFile file(QString::fromLocal8Bit(argv[i]));
         if (!file.open(QIODevice::ReadOnly)) {
-            std::fprintf(stderr, "cannot read %s\n", qPrintable(path));
+            std::fprintf(stderr, "cannot read %s\n", argv[i]);
             return 1;
         }
         const QByteArray data = file.readAll();
-        std::printf("Running: %s\n", qPrintable(path));
+        std::printf("Running: %s\n", argv[i]);
         LLVMFuzzerTestOneInput(reinterpret_cast<const uint8_t *>(data.constData()), size_t(data.size()));
     }
-    std::printf("Executed %lld inputs\n", static_cast<long long>(files.size()));
+    std::printf("Executed %d inputs\n", argc - 1);
     return 0;
 }
 #endif

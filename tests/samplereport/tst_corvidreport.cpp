@@ -2,8 +2,6 @@
 
 #include <QtTest>
 
-#include <unistd.h>
-
 // corvid-report as administrators run it.
 class TestCorvidReport : public QObject
 {
@@ -18,9 +16,6 @@ private Q_SLOTS:
         m_work = m_env->home() + QLatin1String("/work");
         QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/top_usage.xml"), "<usage/>"));
         QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/broken.orb"), "<project"));
-        QDir().mkpath(m_work + QLatin1String("/readonly"));
-        QVERIFY(QFile::setPermissions(m_work + QLatin1String("/readonly"),
-                                      QFile::ReadOwner | QFile::ExeOwner));
     }
 
     void commandLine_data()
@@ -34,14 +29,11 @@ private Q_SLOTS:
         QTest::newRow("no usage file") << QStringList{} << 1 << "no usage file given" << QString();
         QTest::newRow("page beside the usage file")
             << QStringList{"top_usage.xml"} << 0 << page << page;
-        QTest::newRow("page to --out")
+        QTest::newRow("--out into a missing folder")
             << QStringList{"--out", "out/page.html", "top_usage.xml"} << 1 << "cannot write" << QString();
-        QTest::newRow("page to an existing --out folder")
+        QTest::newRow("page to --out")
             << QStringList{"--out", "elsewhere.html", "--design", "x", "top_usage.xml"} << 0
             << m_work + "/elsewhere.html" << m_work + "/elsewhere.html";
-        QTest::newRow("unwritable place")
-            << QStringList{"--out", "readonly/page.html", "top_usage.xml"} << 1 << "cannot write"
-            << QString();
         QTest::newRow("missing project")
             << QStringList{"--project", "nothere.orb", "top_usage.xml"} << 1 << "nothere.orb" << QString();
         QTest::newRow("malformed project")
@@ -56,8 +48,6 @@ private Q_SLOTS:
         QFETCH(int, exitCode);
         QFETCH(QString, expectedOutput);
         QFETCH(QString, expectedPage);
-        if (getuid() == 0 && QTest::currentDataTag() == QLatin1String("unwritable place"))
-            QSKIP("root writes everywhere");
         const CorvidTest::ToolRun tool =
             CorvidTest::runStaged(QStringLiteral("corvid-report"), arguments, m_work);
         QVERIFY2(tool.output.contains(expectedOutput), qPrintable(tool.output));
