@@ -1,7 +1,8 @@
 // The whole page for the sample project, byte for byte. The clock and the
 // new identifiers come through the builder's seams; the random identifier,
 // the creation date and the build values are fixed in the test's private
-// settings, repository and installation.
+// settings, repository and installation. Then corvid-report, the same page
+// made from the command line.
 
 #include "common/TestEnvironment.h"
 
@@ -40,6 +41,7 @@ class TestSampleReport : public QObject
     Q_OBJECT
     std::unique_ptr<CorvidTest::Environment> m_env;
     QString m_projectFile;
+    QString m_work; // corvid-report's working directory
 
     CrvC_ReportBuilder::Environment seams() const
     {
@@ -73,6 +75,10 @@ private Q_SLOTS:
         QVERIFY(QFile::copy(CorvidTest::Environment::sourceDir()
                                 + QLatin1String("/examples/helpviewer/orbhelpviewerdata.xml"),
                             helpFile));
+
+        m_work = m_env->home() + QLatin1String("/work");
+        QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/top_usage.xml"), "<usage/>"));
+        QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/broken.orb"), "<project"));
 
         m_projectFile = project + QLatin1String("/ledctrl.orb");
         QString error;
@@ -121,6 +127,45 @@ private Q_SLOTS:
         const QString page = build(second);
         QVERIFY(page.contains(QLatin1String("<dtag-property name=\"ProjectID\">9a0be000000000000000000000000002")));
         QVERIFY(page.contains(QLatin1String("<dtag-property name=\"ProjectIteration\">2</dtag-property>")));
+    }
+
+    // corvid-report as administrators run it.
+    void commandLine_data()
+    {
+        QTest::addColumn<QStringList>("arguments");
+        QTest::addColumn<int>("exitCode");
+        QTest::addColumn<QString>("expectedOutput");
+        QTest::addColumn<QString>("expectedPage"); // a page that must exist afterwards
+
+        const QString page = m_work + QLatin1String("/device_usage_statistics.html");
+        QTest::newRow("no usage file") << QStringList{} << 1 << "no usage file given" << QString();
+        QTest::newRow("page beside the usage file")
+            << QStringList{"top_usage.xml"} << 0 << page << page;
+        QTest::newRow("--out into a missing folder")
+            << QStringList{"--out", "out/page.html", "top_usage.xml"} << 1 << "cannot write" << QString();
+        QTest::newRow("page to --out")
+            << QStringList{"--out", "elsewhere.html", "--design", "x", "top_usage.xml"} << 0
+            << m_work + "/elsewhere.html" << m_work + "/elsewhere.html";
+        QTest::newRow("missing project")
+            << QStringList{"--project", "nothere.orb", "top_usage.xml"} << 1 << "nothere.orb" << QString();
+        QTest::newRow("malformed project")
+            << QStringList{"--project", "broken.orb", "top_usage.xml"} << 1 << "broken.orb" << QString();
+        QTest::newRow("option without value") << QStringList{"top_usage.xml", "--design"} << 1
+                                              << "--design needs" << QString();
+    }
+
+    void commandLine()
+    {
+        QFETCH(QStringList, arguments);
+        QFETCH(int, exitCode);
+        QFETCH(QString, expectedOutput);
+        QFETCH(QString, expectedPage);
+        const CorvidTest::ToolRun tool =
+            CorvidTest::runStaged(QStringLiteral("corvid-report"), arguments, m_work);
+        QVERIFY2(tool.output.contains(expectedOutput), qPrintable(tool.output));
+        QCOMPARE(tool.exitCode, exitCode);
+        if (!expectedPage.isEmpty())
+            QVERIFY(CorvidTest::readFile(expectedPage).startsWith("<HTML><HEAD>"));
     }
 };
 
