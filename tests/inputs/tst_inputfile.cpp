@@ -51,8 +51,7 @@ const char *name(Case c)
 
 // Plants case `c` at `path`; `reader` names the fuzzers' regression folder
 // that holds the DTD samples. False when it could not be made.
-bool plant(const QString &path, Case c, InputFile::Kind kind,
-                  const QString &reader = QString())
+bool plant(const QString &path, Case c, InputFile::Kind kind, const QString &reader = QString())
 {
     QDir().mkpath(QFileInfo(path).absolutePath());
     QFile::remove(path);
