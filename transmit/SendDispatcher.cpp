@@ -1,6 +1,7 @@
 #include "SendDispatcher.h"
 
 #include "DataCollectionEmail.h"
+#include "MakerServer.h"
 #include "SendUsingSSL.h"
 #include "project/CorvidSettings.h"
 
@@ -83,4 +84,20 @@ void CrvC_SendDispatcher::storeChoice(const Choice &initial, const Choice &chose
     CrvC_Settings::setValue(CrvC_Settings::DontShowSendToDlg, chosen.dontShowAgain);
     if (chosen.emailTool != initial.emailTool)
         CrvC_Settings::setValue(CrvC_Settings::SelectedEmailTool, chosen.emailTool);
+}
+
+CrvC_SendDispatcher::Destination CrvC_SendDispatcher::destination()
+{
+    // The same decisions and values as sendWithoutAsking and the upload's
+    // form fields.
+    Destination to;
+    const bool useSsl = CrvC_Settings::useSsl();
+    to.emailTool = CrvC_Settings::selectedEmailTool();
+    to.method = useSsl ? Method::Upload : Method::Email;
+    to.asks = !useSsl && (!CrvC_Settings::dontShowSendToDlg() || to.emailTool.isEmpty());
+    to.server = CrvC_MakerServer::host();
+    to.registrationId = CrvC_SendUsingSSL::registrationId();
+    to.domain = CrvC_SendUsingSSL::domainName();
+    to.mailbox = emailRecipient();
+    return to;
 }

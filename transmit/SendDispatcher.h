@@ -55,4 +55,18 @@ public:
     // The e-mail's recipient and subject.
     static QString emailRecipient();
     static QString emailSubject();
+
+    // Where the send step takes a report with the stored settings, and what
+    // travels with it: what the user is told before consenting.
+    struct Destination
+    {
+        Method method = Method::Upload;
+        bool asks = false;      // the send method dialog asks first
+        QString server;         // the maker's server (host name) of the upload
+        QString registrationId; // sent beside the page as "regid="
+        QString domain;         // sent beside the page as "domain="
+        QString mailbox;        // the e-mail's recipient
+        QString emailTool;      // the remembered mail program
+    };
+    static Destination destination();
 };

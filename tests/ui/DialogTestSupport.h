@@ -3,13 +3,14 @@
 #include "project/CorvidSettings.h"
 #include "transmit/SendDispatcher.h"
 
+#include <QFile>
 #include <QStringList>
 #include <QVariant>
 
 namespace CorvidTest {
 
-// Records what the send step starts ("upload", "email <tool>") instead of
-// starting it.
+// Records what the send step starts ("upload", "email <tool>"), and the
+// bytes of the file it was handed at that moment, instead of starting it.
 struct SendRecorder
 {
     SendRecorder()
@@ -19,11 +20,14 @@ struct SendRecorder
             sends << (method == CrvC_SendDispatcher::Method::Upload ? QStringLiteral("upload")
                                                                     : QLatin1String("email ") + tool);
             files << file;
+            QFile page(file);
+            pages << (page.open(QIODevice::ReadOnly) ? page.readAll() : QByteArray());
         });
     }
     ~SendRecorder() { CrvC_SendDispatcher::setStarter(nullptr); }
     QStringList sends;
     QStringList files;
+    QList<QByteArray> pages;
 };
 
 // A stored setting; invalid when the key was never written.

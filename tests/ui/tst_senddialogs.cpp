@@ -156,7 +156,7 @@ private Q_SLOTS:
             QCOMPARE(dialog->imp()->progressBar->value(), tick);
         }
         QVERIFY(recorder.sends.isEmpty());
-        const QString report = QFileInfo(dialog->reviewDialog()->reportPath()).absoluteFilePath();
+        const QByteArray page = CorvidTest::readFile(dialog->reviewDialog()->reportPath());
 
         bool reviewed = false;
         CrvC_SendClipDlg *countdown = dialog;
@@ -176,12 +176,58 @@ private Q_SLOTS:
 
         QCOMPARE(reviewed, end == QLatin1String("details") || end == QLatin1String("cancel"));
         QTEST(int(recorder.sends.size()), "sends");
-        if (!recorder.files.isEmpty())
-            QCOMPARE(recorder.files.first(), report);
+        if (!recorder.pages.isEmpty())
+            QCOMPARE(recorder.pages.first(), page);
         QFETCH(bool, boxStored);
         QCOMPARE(stored(CrvC_Settings::DontShowSendProgressDlg), boxStored ? QVariant(true) : QVariant());
         QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
         QVERIFY(dialog.isNull());
+    }
+
+    // A second report of the same design, started while the first counts
+    // down, replaces the page in the folder but not what the first sends,
+    // even from another working directory; declined, it sends nothing and
+    // keeps no copy.
+    void twoCycles_data()
+    {
+        QTest::addColumn<bool>("declineSecond");
+        QTest::newRow("both sent") << false;
+        QTest::newRow("second declined") << true;
+    }
+
+    void twoCycles()
+    {
+        QFETCH(bool, declineSecond);
+        CorvidTest::SendRecorder recorder;
+        QList<QPointer<CrvC_SendClipDlg>> cycles;
+        QList<QByteArray> built;
+        for (const char *device : {"first", "second"}) {
+            CorvidTest::writeFile(QStringLiteral("top_map.ktp"), QByteArray("Target Device : ") + device + '\n');
+            cycles << new CrvC_SendClipDlg(nullptr, QString(), QStringLiteral("top"), QString());
+            cycles.last()->timer()->stop();
+            cycles.last()->show();
+            built << CorvidTest::readFile(cycles.last()->reviewDialog()->reportPath());
+            QVERIFY(built.last().contains(device));
+        }
+        const QString project = QDir::currentPath();
+        const QString secondCopy = cycles.last()->reviewDialog()->builder().pagePath();
+        if (declineSecond) {
+            CorvidTest::onNextModal<CrvC_DataCollectionDialog>([](CrvC_DataCollectionDialog *review) {
+                review->declineButton()->click();
+            });
+            cycles.last()->imp()->detailsButton->click();
+            QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
+        }
+        QVERIFY(QDir::setCurrent(m_env->home()));
+        for (const QPointer<CrvC_SendClipDlg> &cycle : cycles) {
+            for (int tick = 0; cycle && tick < CrvC_SendClipDlg::Steps; ++tick)
+                cycle->OnTimeOut();
+        }
+        QVERIFY(QDir::setCurrent(project));
+        QCOMPARE(recorder.pages, declineSecond ? built.mid(0, 1) : built);
+        QCOMPARE(CorvidTest::readFile(QStringLiteral("device_usage_statistics.html")), built.last());
+        QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
+        QCOMPARE(QFileInfo::exists(secondCopy), !declineSecond);
     }
 };
 
