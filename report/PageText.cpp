@@ -101,7 +101,7 @@ qsizetype readEntity(const QString &s, qsizetype at, QString &text)
         }
         if (name.startsWith(QLatin1Char('#'))) {
             bool ok = false;
-            const bool hex = name.size() > 1 && (name.at(1) == QLatin1Char('x') || name.at(1) == QLatin1Char('X'));
+            const bool hex = name.size() > 1 && name.at(1).toLower() == QLatin1Char('x');
             const uint code = name.mid(hex ? 2 : 1).toUInt(&ok, hex ? 16 : 10);
             if (ok && code > 0 && code <= 0x10ffff) {
                 const char32_t c = code;

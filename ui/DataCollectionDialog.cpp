@@ -48,11 +48,11 @@ qsizetype shownLength(const QString &page)
 
 QString cutNotice()
 {
+    using Dialog = CrvC_DataCollectionDialog;
     return QLatin1String("<P><B>")
-           + CrvC_DataCollectionDialog::tr("This page is too large to be shown here in full; below is its beginning.")
-           + QLatin1String("</B> <A HREF='") + QLatin1String(CrvC_DataCollectionDialog::BrowseContentsUrl)
-           + QLatin1String("'>") + CrvC_DataCollectionDialog::tr("Open the whole page in the web browser")
-           + QLatin1String("</A></P><HR>");
+           + Dialog::tr("This page is too large to be shown here in full; below is its beginning.")
+           + QLatin1String("</B> <A HREF='") + QLatin1String(Dialog::BrowseContentsUrl) + QLatin1String("'>")
+           + Dialog::tr("Open the whole page in the web browser") + QLatin1String("</A></P><HR>");
 }
 
 } // namespace

@@ -128,15 +128,15 @@ private Q_SLOTS:
         QCOMPARE(QFile::exists(builder.reportPath()), !device.isEmpty());
     }
 
-    // Each build's own copy of its page lies in a folder of its own, which a
-    // later build removes once it is KeepDays old; a link there is left alone.
+    // Each build's own copy, in a folder of its own, goes when a later build finds it old.
     void ownCopies()
     {
         CrvC_ReportBuilder::Environment env = environment();
         QDateTime when = QDateTime::currentDateTime();
         env.pageFolder = [&when] { return CrvC_PageStore::newFolder(when); };
         const QString outside = m_dir->filePath(QStringLiteral("outside"));
-        QVERIFY(CorvidTest::writeFile(outside + QLatin1String("/kept"), "x") && QDir().mkpath(CrvC_PageStore::root()));
+        QVERIFY(CorvidTest::writeFile(outside + QLatin1String("/kept"), "x"));
+        QVERIFY(QDir().mkpath(CrvC_PageStore::root()));
         QVERIFY(QFile::link(outside, CrvC_PageStore::root() + QLatin1String("/link")));
         QStringList copies;
         for (int build = 0; build < 2; ++build) {
@@ -144,7 +144,6 @@ private Q_SLOTS:
             builder.createReport(QStringLiteral("top"), QStringLiteral("top"), QString());
             copies << builder.pagePath();
             QCOMPARE(QFileInfo(copies.last()).fileName(), QStringLiteral("device_usage_statistics.html"));
-            QCOMPARE(CorvidTest::readFile(copies.last()), CorvidTest::readFile(builder.reportPath()));
             when = when.addDays(CrvC_PageStore::KeepDays + 1);
         }
         QVERIFY(!QFile::exists(copies.at(0)) && QFile::exists(copies.at(1)));

@@ -9,8 +9,8 @@
 
 namespace CorvidTest {
 
-// Records what the send step starts ("upload", "email <tool>"), and the
-// bytes of the file it was handed at that moment, instead of starting it.
+// Records what the send step starts ("upload", "email <tool>") instead of
+// starting it.
 struct SendRecorder
 {
     SendRecorder()
@@ -27,7 +27,7 @@ struct SendRecorder
     ~SendRecorder() { CrvC_SendDispatcher::setStarter(nullptr); }
     QStringList sends;
     QStringList files;
-    QList<QByteArray> pages;
+    QList<QByteArray> pages; // the files' bytes as the send started
 };
 
 // A stored setting; invalid when the key was never written.

@@ -65,7 +65,6 @@ private Q_SLOTS:
         QTest::newRow("send") << "send" << int(QDialog::Accepted) << "2" << intro;
         QTest::newRow("decline") << "decline" << int(QDialog::Rejected) << QString() << intro;
         QTest::newRow("close") << "close" << int(QDialog::Rejected) << QString() << intro;
-        // No button is the default: Enter, wherever the focus is, sends nothing.
         QTest::newRow("Enter, then close") << "enter" << int(QDialog::Rejected) << QString() << intro;
         // These two only change the tab; the dialog is then declined.
         QTest::newRow("Verify Contents") << "verify" << int(QDialog::Rejected) << QString()
@@ -94,16 +93,13 @@ private Q_SLOTS:
                 sentWhileOpen = recorder.sends;
             } else if (action == QLatin1String("decline")) {
                 open->declineButton()->click();
-            } else if (action == QLatin1String("enter")) {
-                for (QWidget *focus : {static_cast<QWidget *>(open->contentsViewer()),
-                                       static_cast<QWidget *>(open->sendButton())}) {
-                    focus->setFocus();
-                    QTest::keyClick(focus, Qt::Key_Return);
-                    QTest::keyClick(focus, Qt::Key_Enter);
-                }
-                QVERIFY(open->isVisible());
-                open->close();
             } else {
+                if (action == QLatin1String("enter")) {
+                    for (QWidget *focus : QWidgetList{open->contentsViewer(), open->sendButton()}) {
+                        focus->setFocus();
+                        QTest::keyClick(focus, Qt::Key_Return);
+                    }
+                }
                 open->close();
             }
         });
@@ -166,8 +162,7 @@ private Q_SLOTS:
         QTest::addColumn<QString>("design");
 
         QTest::newRow("typed with blanks") << "  led  " << "led";
-        // Cancelled: the cycle ends; nothing written, sent or counted.
-        QTest::newRow("cancelled") << QString() << QString();
+        QTest::newRow("cancelled: nothing written, sent or counted") << QString() << QString();
     }
 
     void designNamePrompt()
@@ -195,10 +190,9 @@ private Q_SLOTS:
         QCOMPARE(QFileInfo(dialog.reportPath()).isFile(), !design.isEmpty());
         QCOMPARE(dialog.builder().data().targetDevice.isEmpty(), design.isEmpty());
         QCOMPARE(recorder.sends.size(), design.isEmpty() ? 0 : 1);
-        QCOMPARE(ProjectRepositoryValues::instance()
-                     .getValue(project, QLatin1String(ProjectRepositoryValues::SendIterationKey))
-                     .isEmpty(),
-                 design.isEmpty());
+        const QString counter = ProjectRepositoryValues::instance().getValue(
+            project, QLatin1String(ProjectRepositoryValues::SendIterationKey));
+        QCOMPARE(counter.isEmpty(), design.isEmpty());
     }
 
     // What the line above the buttons says is what the upload sends.
@@ -207,11 +201,11 @@ private Q_SLOTS:
         QTest::addColumn<bool>("useSsl");
         QTest::addColumn<QVariant>("tool");
         QTest::addColumn<QString>("start"); // how the line begins
-        QTest::addColumn<QString>("names"); // the server or the mail program
 
-        QTest::newRow("upload") << true << QVariant() << "HTTPS upload to " << CrvC_MakerServer::host();
-        QTest::newRow("e-mail") << false << QVariant("/usr/bin/mutt") << "E-mail to " << "/usr/bin/mutt";
-        QTest::newRow("no mail program: asked") << false << QVariant() << "You choose how" << CrvC_MakerServer::host();
+        QTest::newRow("upload") << true << QVariant() << "HTTPS upload to " + CrvC_MakerServer::host() + ",";
+        QTest::newRow("e-mail") << false << QVariant("/usr/bin/mutt")
+            << "E-mail to " + CrvC_SendDispatcher::emailRecipient() + " with /usr/bin/mutt";
+        QTest::newRow("no mail program: asked") << false << QVariant() << "You choose how";
     }
 
     void destination()
@@ -226,24 +220,19 @@ private Q_SLOTS:
         dialog.show();
         const QString line = dialog.destinationLabel()->text();
         QVERIFY2(line.startsWith(start), qPrintable(line));
-        QFETCH(QString, names);
-        QVERIFY(line.contains(names));
         // The identifiers the upload sends beside the page, and only for an upload.
-        const QStringList sent = CrvC_SendUsingSSL(QString()).uploadArguments(QStringLiteral("https://h/"));
-        for (const char *field : {"domain=", "regid="}) {
-            const QString value = sent.filter(QLatin1String(field)).first().mid(int(qstrlen(field)));
-            if (!value.isEmpty())
-                QCOMPARE(line.contains(value), start != QLatin1String("E-mail to "));
-        }
+        const QRegularExpression fields(QStringLiteral("^(domain|regid)=."));
+        const bool upload = !start.startsWith(QLatin1String("E-mail"));
+        for (const QString &field : CrvC_SendUsingSSL(QString()).uploadArguments(QString()).filter(fields))
+            QCOMPARE(line.contains(field.section(QLatin1Char('='), 1)), upload);
     }
 
-    // Values go into the page as they are: where the view would hide some of
-    // their text, the tab shows the page's exact text.
+    // Where the view would hide text that is sent, the tab shows the page's exact text.
     void contents_data()
     {
         QTest::addColumn<QString>("file");
         QTest::addColumn<QByteArray>("content");
-        QTest::addColumn<QStringList>("shown"); // empty: the formatted view is kept
+        QTest::addColumn<QStringList>("shown");
 
         QTest::newRow("usage values") << "top_usage.xml"
                                       << QByteArray("<DeviceUsageReport><DeviceUsage><group name='G'>"
@@ -253,9 +242,6 @@ private Q_SLOTS:
                                       << QStringList{"count<3>=1", "n=<!--", "after=7"};
         QTest::newRow("title in a page") << "par_usage_statistics.html" << QByteArray("<TITLE>kept</TITLE>")
                                          << QStringList{"<TITLE>kept</TITLE>"};
-        QTest::newRow("entities and quoted >")
-            << "par_usage_statistics.html" << QByteArray("<TD TITLE='a>b'>&lt;b&gt; &amp; &#65;</TD>")
-            << QStringList();
     }
 
     void contents()
@@ -267,12 +253,9 @@ private Q_SLOTS:
         CrvC_DataCollectionDialog dialog;
         dialog.createReport(QString(), QStringLiteral("top"), QString());
         QFile::remove(file);
-        QCOMPARE(dialog.contentsAsText(), !shown.isEmpty());
-        const QString text = dialog.contentsViewer()->toPlainText();
+        QVERIFY(dialog.contentsAsText());
         for (const QString &value : shown)
-            QVERIFY2(text.contains(value), qPrintable(value));
-        if (shown.isEmpty())
-            QVERIFY(text.contains(QLatin1String("<b> & A")));
+            QVERIFY2(dialog.contentsViewer()->toPlainText().contains(value), qPrintable(value));
     }
 
     void largeReportInDialog()
@@ -306,7 +289,7 @@ private Q_SLOTS:
         QCOMPARE(page.at(shown.size()), QLatin1Char('\n'));
 
         // Only that link leaves the tab: a link in a value opens nothing.
-        for (const char *link : {"https://www.vantor.example/", "file:///etc/passwd", "corvid:browse-contents"})
+        for (const char *link : {"https://x.example/", "file:///etc/passwd", "corvid:browse-contents"})
             Q_EMIT dialog.contentsViewer()->anchorClicked(QUrl(QLatin1String(link)));
         QCOMPARE(m_opened, QStringList{QUrl::fromLocalFile(dialog.builder().pagePath()).toString()});
         QVERIFY(!QApplication::overrideCursor());
