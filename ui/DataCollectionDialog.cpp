@@ -198,11 +198,18 @@ void CrvC_DataCollectionDialog::verifyContents()
 
 void CrvC_DataCollectionDialog::browseContents()
 {
-    WaitCursor wait;
     const QString path = reportPath();
-    if (!path.isEmpty() && QFileInfo(path).isFile())
-        Gui::Clip::HelpManager::runWebBrowser(
-            QUrl::fromLocalFile(QFileInfo(path).absoluteFilePath()).toString());
+    if (path.isEmpty() || !QFileInfo(path).isFile())
+        return;
+    const QString page = QFileInfo(path).absoluteFilePath();
+    bool opened = false;
+    {
+        WaitCursor wait;
+        opened = Gui::Clip::HelpManager::runWebBrowser(QUrl::fromLocalFile(page).toString());
+    }
+    if (!opened)
+        Gui::Clip::MessageBox::warning(this, windowTitle(),
+                                       tr("No web browser could be started to show the whole page."), page);
 }
 
 void CrvC_DataCollectionDialog::decline()
