@@ -73,8 +73,6 @@ private Q_SLOTS:
         QTest::newRow("defaults, unchanged") << none << QByteArray() << false << true << none << false << false;
         QTest::newRow("installation switched off")
             << none << QByteArray("collectusagestatistics=false\n") << false << false << none << false << true;
-        QTest::newRow("installation file without the switch")
-            << none << QByteArray("timestamp=2020-01-01T00:00:00\n") << false << true << none << false << false;
         QTest::newRow("upload to e-mail") << QVariant(true) << QByteArray() << true << true << QVariant(false) << false
                                           << false;
         QTest::newRow("program remembered") << QVariant(false) << QByteArray() << false << true << QVariant(false)
