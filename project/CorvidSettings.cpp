@@ -58,8 +58,7 @@ void CrvC_Settings::readInstallSettings(QString &timestamp, bool &collect, bool 
             collect = parts.at(1) == QLatin1String("true");
             if (collectFound)
                 *collectFound = true;
-        }
-        else if (parts.at(0) == QLatin1String("timestamp"))
+        } else if (parts.at(0) == QLatin1String("timestamp"))
             timestamp = parts.at(1);
     }
 }
