@@ -25,9 +25,9 @@ namespace {
 void installHandlers()
 {
     CrvC_UserNotice::setHandlers(
-        [](const QString &text) {
+        [](const QString &text, const QString &details) {
             Gui::Clip::MessageBox::warning(nullptr, QCoreApplication::translate("CrvC_CorvidPlugin", "Corvid"),
-                                           text, QMessageBox::Ok);
+                                           text, details, QMessageBox::Ok);
         },
         [](const QString &reportFile) {
             CrvC_SendToClipDlg::showSendMethodDialogForEmail(nullptr, reportFile);

@@ -52,14 +52,18 @@ QString CrvC_SendDispatcher::emailSubject()
 
 bool CrvC_SendDispatcher::sendReport(const QString &reportFile)
 {
-    if (CrvC_Settings::useSsl()) {
+    return send(storedChoice(), reportFile);
+}
+
+bool CrvC_SendDispatcher::send(const Choice &choice, const QString &reportFile)
+{
+    if (choice.useSsl) {
         startMethod(Method::Upload, QString(), reportFile);
         return true;
     }
-    const QString tool = CrvC_Settings::selectedEmailTool();
-    if (tool.isEmpty())
+    if (choice.emailTool.isEmpty())
         return false;
-    startMethod(Method::Email, tool, reportFile);
+    startMethod(Method::Email, choice.emailTool, reportFile);
     return true;
 }
 

@@ -38,6 +38,11 @@ public:
     // program is remembered: then nothing is started.
     static bool sendReport(const QString &reportFile);
 
+    // Starts the method of `choice` for `reportFile` and stores nothing: the
+    // upload when `useSsl`, otherwise the e-mail through `emailTool`. False
+    // when that is empty: then nothing is started.
+    static bool send(const Choice &choice, const QString &reportFile);
+
     // Sends without asking when the user asked for automatic sending
     // ("DontShowSendToDlg") or the upload is the method, and sendReport
     // started something. False means the send method dialog must ask.

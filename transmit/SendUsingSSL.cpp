@@ -2,6 +2,7 @@
 
 #include "transmit/MakerServer.h"
 #include "transmit/ProxyDiscovery.h"
+#include "transmit/SendFailure.h"
 #include "transmit/UserNotice.h"
 
 #include "host/Env.h"
@@ -11,6 +12,7 @@
 #include <QBuffer>
 #include <QCoreApplication>
 #include <QEventLoopLocker>
+#include <QFileInfo>
 #include <QTimer>
 #include <QUrl>
 
@@ -23,6 +25,7 @@ const char *const CrvC_SendUsingSSL::AccessCode = "v9orn";
 const char *const CrvC_SendUsingSSL::RedirectPath =
     "/cgi-bin/SW_Docs_Redirect/sw_docs_redirect?topic=corvidupload";
 const char *const CrvC_SendUsingSSL::CaBundle = "reports/ca-cert-bundle.crt";
+const char *const CrvC_SendUsingSSL::SystemCaBundle = "/etc/ssl/certs/ca-certificates.crt";
 const char *const CrvC_SendUsingSSL::FailureText = QT_TRANSLATE_NOOP(
     "CrvC_SendUsingSSL",
     "Failed to send data through SSL. Please make sure your proxy settings are correct under "
@@ -31,17 +34,14 @@ const char *const CrvC_SendUsingSSL::FailureText = QT_TRANSLATE_NOOP(
 
 namespace {
 
-QString caBundlePath()
-{
-    return QString::fromUtf8(Port_Env::GetDataFileName(CrvC_SendUsingSSL::CaBundle).c_str());
-}
-
 QStringList connectionArguments(const QString &proxy)
 {
     QStringList arguments;
     if (!proxy.isEmpty())
         arguments << QStringLiteral("--proxy") << proxy;
-    arguments << QStringLiteral("--cacert") << caBundlePath();
+    const QString bundle = CrvC_SendUsingSSL::caBundlePath();
+    if (!bundle.isEmpty())
+        arguments << QStringLiteral("--cacert") << bundle;
     return arguments;
 }
 
@@ -80,6 +80,17 @@ CrvC_SendUsingSSL::CrvC_SendUsingSSL(const QString &proxy)
 }
 
 CrvC_SendUsingSSL::~CrvC_SendUsingSSL() = default;
+
+QString CrvC_SendUsingSSL::caBundlePath()
+{
+    const QString installed = QString::fromUtf8(Port_Env::GetDataFileName(CaBundle).c_str());
+    if (QFileInfo(installed).isFile())
+        return installed;
+    const QString named = qEnvironmentVariable("SSL_CERT_FILE");
+    if (!named.isEmpty() && QFileInfo(named).isFile())
+        return named;
+    return QFileInfo(QLatin1String(SystemCaBundle)).isFile() ? QString::fromLatin1(SystemCaBundle) : QString();
+}
 
 QString CrvC_SendUsingSSL::redirectUrl()
 {
@@ -144,7 +155,10 @@ void CrvC_SendUsingSSL::lookupFailedToStart()
     Port_MsgManData::debugStub("Corvid ERROR: cannot start %s: %s\n", ProgramName,
                                qUtf8Printable(m_lookupProcess->errorString()));
     Port_MsgManData::debugStub("Corvid ERROR: Redirected URL is empty.\n");
-    reportFailure(m_reportFile);
+    CrvC_SendFailure::Run run = lookupRun();
+    run.started = false;
+    run.reason = m_lookupProcess->errorString();
+    reportFailure(m_reportFile, run);
     m_lookupProcess->deleteLater();
     deleteLater();
 }
@@ -155,21 +169,21 @@ void CrvC_SendUsingSSL::LaunchSSLProcess()
         return;
     m_ended = true;
     QString address;
-    if (m_lookupProcess->exitStatus() == QProcess::NormalExit && m_lookupProcess->exitCode() == 0) {
+    CrvC_SendFailure::Run run = lookupRun();
+    run.exitStatus = exitStatusOf(m_lookupProcess);
+    if (run.exitStatus == 0) {
         m_lookupProcess->setReadChannel(QProcess::StandardOutput);
         address = uploadAddress(m_lookupProcess);
     } else {
         // An error page or a half-read answer names no address to trust.
+        run.reason = QString::fromUtf8(forDebug(m_lookupProcess->readAllStandardError()));
         Port_MsgManData::debugStub("Corvid ERROR: the address lookup failed (exit status %d): %s\n",
-                                   m_lookupProcess->exitStatus() == QProcess::NormalExit
-                                       ? m_lookupProcess->exitCode()
-                                       : -1,
-                                   forDebug(m_lookupProcess->readAllStandardError()).constData());
+                                   run.exitStatus, qUtf8Printable(run.reason));
     }
 
     if (address.isEmpty()) {
         Port_MsgManData::debugStub("Corvid ERROR: Redirected URL is empty.\n");
-        reportFailure(m_reportFile);
+        reportFailure(m_reportFile, run);
     } else {
         Port_MsgManData::debugStub("Corvid: SSL process to %s has started.\n", qUtf8Printable(address));
         startUpload(address);
@@ -184,6 +198,10 @@ void CrvC_SendUsingSSL::startUpload(const QString &address)
     // ends, holding the application open until then.
     auto *upload = new QProcess;
     const QString reportFile = m_reportFile;
+    CrvC_SendFailure::Run run;
+    run.step = CrvC_SendFailure::Step::Upload;
+    run.url = address;
+    run.proxy = m_proxy;
     std::shared_ptr<QEventLoopLocker> keepAlive = m_keepAlive;
     auto answerStart = std::make_shared<QByteArray>();
     auto keepAnswerStart = [upload, answerStart] {
@@ -193,34 +211,55 @@ void CrvC_SendUsingSSL::startUpload(const QString &address)
     };
     connect(upload, &QProcess::readyReadStandardOutput, upload, keepAnswerStart);
     connect(upload, &QProcess::finished, upload,
-            [upload, reportFile, keepAlive, answerStart, keepAnswerStart](int exitCode,
-                                                                          QProcess::ExitStatus exitStatus) {
+            [upload, reportFile, run, keepAlive, answerStart, keepAnswerStart] {
                 keepAnswerStart();
                 const QByteArray answer = forDebug(*answerStart);
-                const QByteArray errors = forDebug(upload->readAllStandardError());
-                const int status = exitStatus == QProcess::NormalExit ? exitCode : -1;
-                Port_MsgManData::debugStub("Corvid: SSL upload ended with exit status %d: %s\n", status,
-                                           answer.constData());
-                if (status != 0) {
-                    Port_MsgManData::debugStub("Corvid ERROR: SSL upload failed: %s\n", errors.constData());
-                    reportFailure(reportFile);
+                CrvC_SendFailure::Run ended = run;
+                ended.exitStatus = exitStatusOf(upload);
+                ended.reason = QString::fromUtf8(forDebug(upload->readAllStandardError()));
+                Port_MsgManData::debugStub("Corvid: SSL upload ended with exit status %d: %s\n",
+                                           ended.exitStatus, answer.constData());
+                if (ended.exitStatus != 0) {
+                    Port_MsgManData::debugStub("Corvid ERROR: SSL upload failed: %s\n",
+                                               qUtf8Printable(ended.reason));
+                    reportFailure(reportFile, ended);
                 }
                 upload->deleteLater();
             });
-    connect(upload, &QProcess::errorOccurred, upload, [upload, reportFile, keepAlive](QProcess::ProcessError error) {
-        if (error != QProcess::FailedToStart)
-            return; // the finished signal follows
-        Port_MsgManData::debugStub("Corvid ERROR: cannot start %s: %s\n", ProgramName,
-                                   qUtf8Printable(upload->errorString()));
-        upload->deleteLater();
-        QTimer::singleShot(0, [reportFile, keepAlive] { reportFailure(reportFile); });
-    });
+    connect(upload, &QProcess::errorOccurred, upload,
+            [upload, reportFile, run, keepAlive](QProcess::ProcessError error) {
+                if (error != QProcess::FailedToStart)
+                    return; // the finished signal follows
+                Port_MsgManData::debugStub("Corvid ERROR: cannot start %s: %s\n", ProgramName,
+                                           qUtf8Printable(upload->errorString()));
+                CrvC_SendFailure::Run notStarted = run;
+                notStarted.started = false;
+                notStarted.reason = upload->errorString();
+                upload->deleteLater();
+                QTimer::singleShot(0, [reportFile, notStarted, keepAlive] {
+                    reportFailure(reportFile, notStarted);
+                });
+            });
     upload->start(QLatin1String(ProgramName), uploadArguments(address), QIODevice::ReadWrite);
 }
 
-void CrvC_SendUsingSSL::reportFailure(const QString &reportFile)
+CrvC_SendFailure::Run CrvC_SendUsingSSL::lookupRun() const
 {
-    CrvC_UserNotice::warning(tr(FailureText));
+    CrvC_SendFailure::Run run;
+    run.step = CrvC_SendFailure::Step::Lookup;
+    run.url = redirectUrl();
+    run.proxy = m_proxy;
+    return run;
+}
+
+int CrvC_SendUsingSSL::exitStatusOf(const QProcess *process)
+{
+    return process->exitStatus() == QProcess::NormalExit ? process->exitCode() : -1;
+}
+
+void CrvC_SendUsingSSL::reportFailure(const QString &reportFile, const CrvC_SendFailure::Run &run)
+{
+    CrvC_UserNotice::warning(tr(FailureText), CrvC_SendFailure::details(run, reportFile));
     CrvC_UserNotice::offerEmail(reportFile);
 }
 

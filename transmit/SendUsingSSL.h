@@ -1,5 +1,7 @@
 #pragma once
 
+#include "transmit/SendFailure.h"
+
 #include <QObject>
 #include <QProcess>
 #include <QString>
@@ -14,7 +16,8 @@ class QIODevice;
 // a lookup of the current upload address at the maker's redirect service,
 // then the form upload. Create it with new, call SendFile once and forget it:
 // it deletes itself. A lookup or upload that fails warns the user and offers
-// the e-mail method (CrvC_UserNotice). The application is kept running
+// the e-mail method (CrvC_UserNotice), with the cause beneath the warning
+// (CrvC_SendFailure). The application is kept running
 // (QEventLoopLocker) until the upload has ended.
 class CrvC_SendUsingSSL : public QObject
 {
@@ -24,6 +27,7 @@ public:
     static const char *const AccessCode;   // the upload form's fixed access code
     static const char *const RedirectPath; // path and query of the redirect service
     static const char *const CaBundle;     // data file with the trusted authorities
+    static const char *const SystemCaBundle; // the system's trust store (Debian's ca-certificates)
     static const char *const FailureText;  // the warning after a failed send
 
     // Takes the proxy from CrvC_ProxyDiscovery::findProxy().
@@ -36,9 +40,15 @@ public:
     void SendFile(const QString &file);
 
     QString proxy() const { return m_proxy; }
-    // The lookup's arguments: [--proxy P] --cacert BUNDLE REDIRECT_URL.
+    // The authorities the server's certificate is checked against: the
+    // installation's CaBundle when it exists, else the system's trust store
+    // (the file that SSL_CERT_FILE names, else SystemCaBundle). Empty when
+    // there is none of them: vancurl then uses libcurl's built-in default.
+    // Verification is never switched off.
+    static QString caBundlePath();
+    // The lookup's arguments: [--proxy P] [--cacert BUNDLE] REDIRECT_URL.
     QStringList redirectArguments() const;
-    // The upload's arguments: [--proxy P] --cacert BUNDLE, the four -F fields
+    // The upload's arguments: [--proxy P] [--cacert BUNDLE], the four -F fields
     // (file_loc, domain, regid, access), then `url`.
     QStringList uploadArguments(const QString &url) const;
 
@@ -67,7 +77,9 @@ public Q_SLOTS:
 private:
     void lookupFailedToStart();
     void startUpload(const QString &address);
-    static void reportFailure(const QString &reportFile);
+    CrvC_SendFailure::Run lookupRun() const;
+    static int exitStatusOf(const QProcess *process);
+    static void reportFailure(const QString &reportFile, const CrvC_SendFailure::Run &run);
 
     QString m_proxy;
     QString m_reportFile;

@@ -272,10 +272,17 @@ void CrvC_DataCollectionDialog::verifyContents()
 
 void CrvC_DataCollectionDialog::browseContents()
 {
-    WaitCursor wait;
     const QString path = m_builder.pagePath();
-    if (!path.isEmpty() && QFileInfo(path).isFile())
-        Gui::Clip::HelpManager::runWebBrowser(QUrl::fromLocalFile(path).toString());
+    if (path.isEmpty() || !QFileInfo(path).isFile())
+        return;
+    bool opened = false;
+    {
+        WaitCursor wait;
+        opened = Gui::Clip::HelpManager::runWebBrowser(QUrl::fromLocalFile(path).toString());
+    }
+    if (!opened)
+        Gui::Clip::MessageBox::warning(this, windowTitle(),
+                                       tr("No web browser could be started to show the whole page."), path);
 }
 
 void CrvC_DataCollectionDialog::decline()
