@@ -117,11 +117,11 @@ private Q_SLOTS:
         // receiver) is skipped, not reused.
         const int before = m_server->uploadFolders().size();
         const QString next = m_server->dataDir() + QString("/%1").arg(before + 1, 6, 10, QLatin1Char('0'));
-        QVERIFY(writeFile(next + "/fields.txt", "earlier\n"));
+        QVERIFY(writeFile(next + "/" + TestServer::fieldsFileName(), "earlier\n"));
         const QString upload = "--cacert {CA} -F file_loc=@{REPORT} -F domain=x.y -F access=v9orn {URL}/upload";
         QCOMPARE(vancurl(upload), 0);
         QCOMPARE(vancurl(upload), 0);
-        QCOMPARE(readFile(next + "/fields.txt"), QByteArray("earlier\n"));
+        QCOMPARE(readFile(next + "/" + TestServer::fieldsFileName()), QByteArray("earlier\n"));
         QCOMPARE(m_server->uploadFolders().size(), before + 3);
         QCOMPARE(m_server->upload(before + 2).fields.value("domain"), QStringLiteral("x.y"));
         QCOMPARE(m_server->upload(before + 1).file, readFile(m_report));
