@@ -2,6 +2,7 @@
 
 #include <dirent.h>
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <stdio.h>
 #include <unistd.h>
 
@@ -66,7 +67,9 @@ std::string UploadStore::createIncoming()
     std::string path = m_dir + "/.incoming-XXXXXX";
     std::vector<char> name(path.begin(), path.end());
     name.push_back('\0');
-    if (!::mkdtemp(name.data()))
+    // mkdtemp makes the folder for its owner only; stored folders are as
+    // readable as the data folder.
+    if (!::mkdtemp(name.data()) || ::chmod(name.data(), 0755) != 0)
         return std::string();
     return name.data();
 }

@@ -29,6 +29,7 @@ const char redirectTopic[] = "corvidupload";
 const char usage[] =
     "Usage: corvid-receiver --listen ADDRESS --port PORT --data DIR --cert FILE --key FILE\n"
     "                       [--max-bytes N] [--threads N] [--timeout S] [--no-redirect]\n"
+    "                       [--moved URL]\n"
     "\n"
     "Serves, over HTTPS, the redirect page that names the upload address and the\n"
     "upload form that Corvid posts its usage reports to, and stores every accepted\n"
@@ -49,6 +50,8 @@ const char usage[] =
     "                    (default 10, 1 to 3600).\n"
     "  --no-redirect     The redirect page names no upload address (to try out a\n"
     "                    client's failure path).\n"
+    "  --moved URL       POST /upload answers 307 with Location: URL and stores\n"
+    "                    nothing (to try out a client's failure path).\n"
     "  -h, --help        Show this text.\n"
     "\n"
     "The first line on standard output is \"listening on https://ADDRESS:PORT\"; then\n"
@@ -97,8 +100,8 @@ void answer(httplib::Response &response, int status, const std::string &text)
 }
 
 // Reads, checks and stores one upload form.
-void receiveUpload(UploadStore &store, const httplib::Request &request, httplib::Response &response,
-                   const httplib::ContentReader &reader)
+void receiveUpload(UploadStore &store, size_t maxBytes, const httplib::Request &request,
+                   httplib::Response &response, const httplib::ContentReader &reader)
 {
     if (!request.is_multipart_form_data())
         return answer(response, 400, "refused: not a multipart form\n");
@@ -109,7 +112,8 @@ void receiveUpload(UploadStore &store, const httplib::Request &request, httplib:
     const bool overLimit = !read && ReceiverServer::bodyOverLimit();
     ReceiverServer::bodyRead();
     if (overLimit)
-        return answer(response, 413, "refused: the request body is larger than the limit\n");
+        return answer(response, 413,
+                      "refused: the request body is larger than " + std::to_string(maxBytes) + " bytes\n");
     if (!form.finish(read))
         return answer(response, form.refusalStatus(), form.refusalText());
     const unsigned number = form.store(request.remote_addr);
@@ -134,7 +138,7 @@ long long numberArgument(const std::string &text, long long min, long long max)
 
 int main(int argc, char **argv)
 {
-    std::string address, dataDir, certFile, keyFile;
+    std::string address, dataDir, certFile, keyFile, movedTo;
     long long port = -1;
     ReceiverServer::Limits limits;
     bool redirect = true;
@@ -167,6 +171,8 @@ int main(int argc, char **argv)
             if (bytes < 0)
                 return fail("--max-bytes needs a positive number");
             limits.maxBodyBytes = size_t(bytes);
+        } else if (arg == "--moved") {
+            movedTo = value;
         } else if (arg == "--threads") {
             const long long threads = numberArgument(value, 1, 256);
             if (threads < 0)
@@ -220,9 +226,12 @@ int main(int argc, char **argv)
         page += "</head>\n<body>\n<p>The upload service has moved.</p>\n</body>\n</html>\n";
         response.set_content(page, "text/html");
     });
-    server.Post("/upload", [&store](const httplib::Request &request, httplib::Response &response,
-                                    const httplib::ContentReader &reader) {
-        receiveUpload(store, request, response, reader);
+    server.Post("/upload", [&](const httplib::Request &request, httplib::Response &response,
+                               const httplib::ContentReader &reader) {
+        if (movedTo.empty())
+            return receiveUpload(store, limits.maxBodyBytes, request, response, reader);
+        response.set_redirect(movedTo, 307);
+        response.set_content("moved\n", "text/plain");
     });
     server.set_logger([](const httplib::Request &request, const httplib::Response &response) {
         using ReceiverText::escaped;
