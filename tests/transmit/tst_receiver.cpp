@@ -81,8 +81,10 @@ class TestReceiver : public QObject
     // refused or cut upload would leave behind.
     QStringList leftovers() const
     {
-        QStringList names = QDir(m_server->dataDir()).entryList(QDir::AllEntries | QDir::Hidden | QDir::NoDotAndDotDot);
-        names.removeIf([](const QString &name) { return QRegularExpression("^\\d{6,}$").match(name).hasMatch(); });
+        const QRegularExpression number("^\\d{6,}$");
+        QStringList names =
+            QDir(m_server->dataDir()).entryList(QDir::AllEntries | QDir::Hidden | QDir::NoDotAndDotDot);
+        names.removeIf([&number](const QString &name) { return number.match(name).hasMatch(); });
         return names;
     }
 
@@ -106,8 +108,8 @@ private Q_SLOTS:
         const QByteArray big = form("big.html", QByteArray(30000, 'x'));
         QTest::newRow("chunked") << uploadHead + "Transfer-Encoding: chunked\r\n\r\n" + chunked(upload)
                                  << QByteArray("200 OK") << QByteArray("device_usage_statistics.html");
-        QTest::newRow("chunked over the limit") << uploadHead + "Transfer-Encoding: chunked\r\n\r\n" + chunked(big)
-                                                << QByteArray("413 ") << QByteArray();
+        QTest::newRow("chunked over the limit")
+            << uploadHead + "Transfer-Encoding: chunked\r\n\r\n" + chunked(big) << QByteArray("413 ") << QByteArray();
         QTest::newRow("no length") << uploadHead + "\r\n" + upload << QByteArray("411 ") << QByteArray();
         QTest::newRow("length and chunked")
             << uploadHead + "Content-Length: 10\r\nTransfer-Encoding: chunked\r\n\r\n" + chunked(upload)
@@ -117,8 +119,8 @@ private Q_SLOTS:
         for (int i = 0; i < 150; ++i)
             lines += "X-Line-" + QByteArray::number(i) + ": " + QByteArray(i < 101 ? 1 : 2000, 'y') + "\r\n";
         QTest::newRow("too many header lines")
-            << uploadHead + sized + lines.left(lines.indexOf("X-Line-101")) + "\r\n" + upload << QByteArray("431 ")
-            << QByteArray();
+            << uploadHead + sized + lines.left(lines.indexOf("X-Line-101")) + "\r\n" + upload
+            << QByteArray("431 ") << QByteArray();
         QTest::newRow("header flood") << uploadHead + sized + lines + "\r\n" + upload << QByteArray("400 ")
                                       << QByteArray();
         const QByteArray named = form("fields.txt", report);

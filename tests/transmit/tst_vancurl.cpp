@@ -79,11 +79,12 @@ private Q_SLOTS:
         // Only file_loc names a file: the secret stays on the machine.
         for (const QString start : {"@", "<"})
             QTest::newRow(qPrintable("registration text starting with " + start))
-                << "--cacert {CA} " + form + "-F regid=" + start + "{DIR}/secret -F access=v9orn {URL}/upload" << 0
-                << "received" << 1 << start + "{DIR}/secret";
+                << "--cacert {CA} " + form + "-F regid=" + start + "{DIR}/secret -F access=v9orn {URL}/upload"
+                << 0 << "received" << 1 << start + "{DIR}/secret";
         QTest::newRow("upload answered with a redirection")
             << "--cacert {MOVEDCA} " + form + "-F access=v9orn {MOVED}/upload" << 8 << "" << 0 << "";
-        QTest::newRow("unreachable proxy") << "--proxy 127.0.0.1:9 --cacert {CA} {LOOKUP}" << 4 << "" << 0 << "";
+        QTest::newRow("unreachable proxy")
+            << "--proxy 127.0.0.1:9 --cacert {CA} {LOOKUP}" << 4 << "" << 0 << "";
         QTest::newRow("wrong access code")
             << "--cacert {CA} " + form + "-F access=v9orm {URL}/upload" << 6 << "" << 0 << "";
         QTest::newRow("file field not a file")

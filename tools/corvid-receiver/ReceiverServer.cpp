@@ -98,8 +98,10 @@ int ReceiverServer::screen(const httplib::Request &request, std::string &text) c
         text = "refused: the request's length is unclear\n";
         return 400;
     }
-    if (lengths == 0 && (!coded || request.get_header_value_count("Transfer-Encoding") > 1
-                         || ::strcasecmp(request.get_header_value("Transfer-Encoding").c_str(), "chunked") != 0)) {
+    const std::string coding = request.get_header_value("Transfer-Encoding");
+    if (lengths == 0
+        && (!coded || request.get_header_value_count("Transfer-Encoding") > 1
+            || ::strcasecmp(coding.c_str(), "chunked") != 0)) {
         text = "refused: a request body needs a Content-Length or chunked transfer coding\n";
         return 411;
     }

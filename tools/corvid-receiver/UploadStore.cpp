@@ -20,10 +20,12 @@ namespace {
 // The number a folder name stands for: digits only; 0 for any other name.
 unsigned numberOf(const char *name)
 {
+    if (!std::isdigit(static_cast<unsigned char>(name[0])))
+        return 0;
     char *end = nullptr;
     errno = 0;
-    const unsigned long value = std::isdigit(static_cast<unsigned char>(name[0])) ? std::strtoul(name, &end, 10) : 0;
-    return end && !*end && errno == 0 && value <= 0xffffffffUL ? unsigned(value) : 0;
+    const unsigned long value = std::strtoul(name, &end, 10);
+    return !*end && errno == 0 && value <= 0xffffffffUL ? unsigned(value) : 0;
 }
 
 void syncFolder(const std::string &folder)

@@ -305,7 +305,7 @@ int main(int argc, char **argv)
     if (status >= 300)
         return fail(RedirectError, "HTTP status " + std::to_string(status) + " from " + url
                                        + ", a redirection, which is not followed"
-                                       + (redirectTarget.empty() ? std::string() : " (to " + redirectTarget + ")"));
+                                       + (redirectTarget.empty() ? "" : " (to " + redirectTarget + ")"));
     if (transfer.timedOut)
         return fail(TimeLimitError, "the transfer took longer than its limit of " + std::to_string(limitSeconds)
                                         + " s (" + url + ")");
