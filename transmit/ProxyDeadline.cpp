@@ -1,6 +1,8 @@
 #include "ProxyDeadline.h"
 
+#include <QElapsedTimer>
 #include <QProcess>
+#include <QThread>
 
 #include <csignal>
 #include <sys/prctl.h>
@@ -19,7 +21,7 @@ CrvC_ProxyDeadline::CrvC_ProxyDeadline()
 }
 
 CrvC_ProxyDeadline::CrvC_ProxyDeadline(int limitMs)
-    : m_deadline(limitMs)
+    : m_deadline(limitMs, Qt::PreciseTimer)
     , m_stopped(std::make_shared<std::atomic<bool>>(false))
 {
 }
@@ -27,7 +29,7 @@ CrvC_ProxyDeadline::CrvC_ProxyDeadline(int limitMs)
 CrvC_ProxyDeadline CrvC_ProxyDeadline::within(int limitMs) const
 {
     CrvC_ProxyDeadline shorter = *this;
-    const QDeadlineTimer step(limitMs);
+    const QDeadlineTimer step(limitMs, Qt::PreciseTimer);
     if (m_deadline.isForever() || step < m_deadline)
         shorter.m_deadline = step;
     return shorter;
@@ -87,12 +89,18 @@ bool CrvC_ProxyDeadline::run(const QString &program, const QStringList &argument
         }
         const qint64 left = remainingMs();
         const int slice = left < 0 || left > SliceMs ? SliceMs : int(left);
-        if (process.state() == QProcess::Starting)
+        if (process.state() == QProcess::Starting) {
             process.waitForStarted(slice);
-        else if (output)
-            process.waitForReadyRead(slice);
-        else
+        } else if (output) {
+            QElapsedTimer waited;
+            waited.start();
+            // A program that closed its output but runs on gives no more
+            // read events: only its end is waited for then.
+            if (!process.waitForReadyRead(slice) && waited.elapsed() < slice / 2)
+                QThread::msleep(slice);
+        } else {
             process.waitForFinished(slice);
+        }
     }
     return !cut && process.error() != QProcess::FailedToStart && process.exitStatus() == QProcess::NormalExit
            && process.exitCode() == 0;

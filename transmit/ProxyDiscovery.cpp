@@ -7,6 +7,7 @@
 #include "host/Settings.h"
 #include "host/String.h"
 
+#include <QCoreApplication>
 #include <QSet>
 #include <QThread>
 #include <QTimer>
@@ -55,6 +56,7 @@ void CrvC_ProxyDiscovery::start(int limitMs)
     m_deadline = CrvC_ProxyDeadline(limitMs);
     m_limit = new QTimer(this);
     m_limit->setSingleShot(true);
+    m_limit->setTimerType(Qt::PreciseTimer);
     connect(m_limit, &QTimer::timeout, this, [this] { finish(QString(), true); });
     m_limit->start(limitMs);
 
@@ -95,15 +97,17 @@ void CrvC_ProxyDiscovery::finish(const QString &proxy, bool gaveUp)
 
 void CrvC_ProxyDiscovery::stop()
 {
+    // The timer is left alone: this may run after the application object has
+    // gone, and a late timeout finds the discovery ended.
     m_ended = true;
     m_deadline.stop();
-    if (m_limit)
-        m_limit->stop();
     if (m_worker) {
         m_worker->wait();
         delete m_worker;
         m_worker = nullptr;
     }
+    // An answer already posted would otherwise outlive the library's code.
+    QCoreApplication::removePostedEvents(this, QEvent::MetaCall);
 }
 
 void CrvC_ProxyDiscovery::stopAll()
