@@ -7,8 +7,6 @@
 #include <atomic>
 #include <memory>
 
-class QProcess;
-
 // The time proxy discovery may still take, and a switch that ends it early.
 // Copies share the switch: stopping one stops every deadline derived from it
 // with within(), so that the whole discovery, whichever step it is in, ends
