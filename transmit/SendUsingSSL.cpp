@@ -69,7 +69,8 @@ std::shared_ptr<QEventLoopLocker> keepApplicationAlive()
 } // namespace
 
 CrvC_SendUsingSSL::CrvC_SendUsingSSL()
-    : CrvC_SendUsingSSL(CrvC_ProxyDiscovery::findProxy())
+    : QObject(nullptr)
+    , m_proxyKnown(false)
 {
 }
 
@@ -118,6 +119,21 @@ QStringList CrvC_SendUsingSSL::uploadArguments(const QString &url) const
 
 void CrvC_SendUsingSSL::SendFile(const QString &file)
 {
+    if (!m_proxyKnown) {
+        // The proxy is found in the background (it may take seconds); the
+        // send goes on with its answer.
+        if (m_discovery)
+            return;
+        m_keepAlive = keepApplicationAlive();
+        m_discovery = new CrvC_ProxyDiscovery(this);
+        connect(m_discovery, &CrvC_ProxyDiscovery::finished, this, [this, file](const QString &proxy) {
+            m_proxy = proxy;
+            m_proxyKnown = true;
+            SendFile(file);
+        });
+        m_discovery->start();
+        return;
+    }
     if (m_lookupProcess) {
         Port_MsgManData::debugStub("Corvid ERROR: a send is already under way for %s\n",
                                    qUtf8Printable(m_reportFile));

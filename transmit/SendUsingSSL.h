@@ -9,6 +9,7 @@
 
 #include <memory>
 
+class CrvC_ProxyDiscovery;
 class QEventLoopLocker;
 class QIODevice;
 
@@ -30,7 +31,8 @@ public:
     static const char *const SystemCaBundle; // the system's trust store (Debian's ca-certificates)
     static const char *const FailureText;  // the warning after a failed send
 
-    // Takes the proxy from CrvC_ProxyDiscovery::findProxy().
+    // Finds the proxy with CrvC_ProxyDiscovery when SendFile is called, in
+    // the background; the lookup starts with its answer.
     CrvC_SendUsingSSL();
     // Uses `proxy` ("host:port", empty for none) without any discovery.
     explicit CrvC_SendUsingSSL(const QString &proxy);
@@ -82,6 +84,8 @@ private:
     static void reportFailure(const QString &reportFile, const CrvC_SendFailure::Run &run);
 
     QString m_proxy;
+    bool m_proxyKnown = true;
+    CrvC_ProxyDiscovery *m_discovery = nullptr;
     QString m_reportFile;
     QProcess *m_lookupProcess = nullptr;
     bool m_ended = false;
