@@ -19,6 +19,7 @@
 #include <QCoreApplication>
 #include <QFileInfo>
 #include <QSaveFile>
+#include <QStringEncoder>
 
 #include <QThread>
 
@@ -83,6 +84,27 @@ void releaseFreedMemory()
 #if defined(__GLIBC__)
     malloc_trim(0);
 #endif
+}
+
+// The UTF-8 of `text` in a buffer of its own size. QString::toUtf8() makes
+// room for three bytes a character and keeps it, which for the sections of
+// a large project is tens of megabytes for nothing; this measures the text
+// first, a chunk at a time, then encodes it into its final buffer.
+QByteArray compactUtf8(QStringView text)
+{
+    constexpr qsizetype Chunk = 64 * 1024;
+    char scratch[3 * Chunk];
+    QStringEncoder measure(QStringEncoder::Utf8);
+    qsizetype size = 0;
+    for (qsizetype at = 0; at < text.size(); at += Chunk)
+        size += measure.appendToBuffer(scratch, text.mid(at, Chunk)) - scratch;
+    QByteArray bytes(size, Qt::Uninitialized);
+    QStringEncoder encode(QStringEncoder::Utf8);
+    char *end = bytes.data();
+    for (qsizetype at = 0; at < text.size(); at += Chunk)
+        end = encode.appendToBuffer(end, text.mid(at, Chunk));
+    Q_ASSERT(end == bytes.data() + size);
+    return bytes;
 }
 
 // Runs the pure file readers side by side. The calling thread reads the
@@ -191,8 +213,12 @@ public:
         if (m_lines++ > 0)
             add(QStringLiteral("\n"));
         write(line);
-        if (!m_cut)
-            keep(QString::fromUtf8(line));
+        if (m_cut)
+            return;
+        // Three bytes hold at least one UTF-16 unit, so this prefix decodes
+        // to more than the room left, a split last character past the cut.
+        const qsizetype room = PageTextLimit - m_text.size();
+        keep(QString::fromUtf8(line.constData(), qMin(line.size(), 3 * (room + 1))));
     }
 
     // True when the whole page is in place of the previous file.
@@ -360,13 +386,13 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
                 return;
             const QString text = CrvC_CommandLog::commandLineHistorySection(commands);
             commands.commandHistory.clear();
-            history = text.toUtf8();
+            history = compactUtf8(text);
         },
-        [&] { cores = CrvC_CoresStatistics().sectionText(coresReport).toUtf8(); },
-        [&] { help = CrvC_HelpViewerData().sectionText().toUtf8(); },
+        [&] { cores = CrvC_CoresStatistics().sectionText(coresReport); },
+        [&] { help = compactUtf8(CrvC_HelpViewerData().sectionText()); },
         [&] { CrvC_SynthesisReport::readMacroStatistics(synthesisReport, macros); },
-        [&] { par = CrvC_RunStatistics::parUsageSection(parPage).toUtf8(); },
-        [&] { osim = CrvC_RunStatistics::osimUsageSection(osimPage).toUtf8(); },
+        [&] { par = compactUtf8(CrvC_RunStatistics::parUsageSection(parPage)); },
+        [&] { osim = compactUtf8(CrvC_RunStatistics::osimUsageSection(osimPage)); },
     });
 
     const QString fileName = QString::fromLatin1(ReportFileName);
