@@ -10,18 +10,19 @@ const QLatin1String ScopeTag("scope");
 const QLatin1String ItemTag("item");
 const QLatin1String StringIdAttribute("stringID");
 
-void appendTagged(QByteArray &text, QLatin1String tag, QStringView value)
+void appendTagged(CrvC_SectionBuffer &text, QLatin1String tag, QStringView value)
 {
     if (tag.isEmpty()) {
-        text += value.toUtf8();
+        text += value;
         return;
     }
+    const QByteArrayView name(tag.data(), tag.size());
     text += '<';
-    text.append(tag.data(), tag.size());
+    text += name;
     text += '>';
-    text += value.toUtf8();
-    text += "</";
-    text.append(tag.data(), tag.size());
+    text += value;
+    text += QByteArrayView("</");
+    text += name;
     text += '>';
 }
 
@@ -73,10 +74,10 @@ bool CrvC_CoresStatistics::characters(const QString &)
 void CrvC_CoresStatistics::startInstance()
 {
     if (m_pairs < 0) {
-        m_text += "&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
+        *m_text += QByteArrayView("&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
                   "<dtag-section name=\"CorelibStatistics\">\n"
                   "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=4>"
-                  "<B>Core Statistics</B></TD></TR>\n";
+                  "<B>Core Statistics</B></TD></TR>\n");
     } else {
         endInstance();
     }
@@ -88,7 +89,7 @@ void CrvC_CoresStatistics::startInstance()
 void CrvC_CoresStatistics::endInstance()
 {
     if (m_pairs == 0)
-        m_text += "<TR>\n";
+        *m_text += QByteArrayView("<TR>\n");
 }
 
 void CrvC_CoresStatistics::appendPair(QLatin1String nameTag, QStringView name, QLatin1String valueTag,
@@ -98,16 +99,16 @@ void CrvC_CoresStatistics::appendPair(QLatin1String nameTag, QStringView name, Q
     // section ends only the last one.
     const qsizetype cell = m_pairs - 1;
     if (cell < 0) {
-        m_text += "<TR ALIGN=CENTER><TD COLSPAN=4><B>";
+        *m_text += QByteArrayView("<TR ALIGN=CENTER><TD COLSPAN=4><B>");
     } else {
         if (cell > 0 && cell % 4 == 0)
-            m_text += "\n</TR><TR>";
-        m_text += "<TD>";
+            *m_text += QByteArrayView("\n</TR><TR>");
+        *m_text += QByteArrayView("<TD>");
     }
-    appendTagged(m_text, nameTag, name);
-    m_text += '=';
-    appendTagged(m_text, valueTag, value);
-    m_text += cell < 0 ? "</B></TD></TR>\n<TR>\n" : "</TD>\n";
+    appendTagged(*m_text, nameTag, name);
+    *m_text += '=';
+    appendTagged(*m_text, valueTag, value);
+    *m_text += QByteArrayView(cell < 0 ? "</B></TD></TR>\n<TR>\n" : "</TD>\n");
     ++m_pairs;
 }
 
@@ -122,18 +123,26 @@ void CrvC_CoresStatistics::appendParameters(const QXmlAttributes &atts,
     }
 }
 
-QByteArray CrvC_CoresStatistics::sectionText(const QString &path)
+void CrvC_CoresStatistics::writeSection(const QString &path, CrvC_SectionBuffer &out)
 {
-    m_text.clear();
+    out.clear();
+    m_text = &out;
     m_inInstance = false;
     m_pairs = -1;
     // A refused document counts as unreadable, whatever was collected.
     if (CrvC_XmlDepthGuard::parseFile(path, Port::InputFile::CoreReport, *this)
-            == CrvC_XmlDepthGuard::Outcome::Refused
-        || m_pairs < 0)
-        return QByteArray();
-    endInstance();
-    m_text += "</TR></dtag-section></TABLE>";
-    m_text.squeeze();
-    return std::move(m_text);
+        == CrvC_XmlDepthGuard::Outcome::Refused) {
+        out.clear();
+    } else if (m_pairs >= 0) {
+        endInstance();
+        out += QByteArrayView("</TR></dtag-section></TABLE>");
+    }
+    m_text = nullptr;
+}
+
+QByteArray CrvC_CoresStatistics::sectionText(const QString &path)
+{
+    CrvC_SectionBuffer text;
+    writeSection(path, text);
+    return text.takeAll();
 }

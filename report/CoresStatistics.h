@@ -4,6 +4,8 @@
 
 #include <initializer_list>
 
+#include "SectionBuffer.h"
+
 #include <QByteArray>
 #include <QString>
 #include <QStringView>
@@ -30,10 +32,12 @@ public:
                     const QString &qName) override;
     bool characters(const QString &ch) override;
 
-    // Parses the report at `path` and answers the section text in UTF-8:
-    // empty when the file is missing or holds no core instance, or is
-    // refused as too large or too deeply nested. A malformed file gives the
-    // instances read before the error.
+    // Parses the report at `path` and writes the section to `out`: nothing
+    // when the file is missing or holds no core instance, or is refused as
+    // too large or too deeply nested. A malformed file gives the instances
+    // read before the error.
+    void writeSection(const QString &path, CrvC_SectionBuffer &out);
+    // The same section in one piece.
     QByteArray sectionText(const QString &path);
 
 private:
@@ -47,7 +51,7 @@ private:
     // except those named in `skipped`.
     void appendParameters(const QXmlAttributes &atts, std::initializer_list<QLatin1String> skipped);
 
-    QByteArray m_text;
+    CrvC_SectionBuffer *m_text = nullptr;
     bool m_inInstance = false;
     // Pairs of the last instance so far; -1 before the first instance.
     qsizetype m_pairs = -1;

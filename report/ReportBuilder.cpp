@@ -4,6 +4,7 @@
 #include "HelpViewerData.h"
 #include "ProjectStatistics.h"
 #include "RunStatistics.h"
+#include "SectionBuffer.h"
 #include "SynthesisReport.h"
 #include "UsageXml.h"
 #include "VersionSection.h"
@@ -19,7 +20,6 @@
 #include <QCoreApplication>
 #include <QFileInfo>
 #include <QSaveFile>
-#include <QStringEncoder>
 
 #include <QThread>
 
@@ -84,27 +84,6 @@ void releaseFreedMemory()
 #if defined(__GLIBC__)
     malloc_trim(0);
 #endif
-}
-
-// The UTF-8 of `text` in a buffer of its own size. QString::toUtf8() makes
-// room for three bytes a character and keeps it, which for the sections of
-// a large project is tens of megabytes for nothing; this measures the text
-// first, a chunk at a time, then encodes it into its final buffer.
-QByteArray compactUtf8(QStringView text)
-{
-    constexpr qsizetype Chunk = 64 * 1024;
-    char scratch[3 * Chunk];
-    QStringEncoder measure(QStringEncoder::Utf8);
-    qsizetype size = 0;
-    for (qsizetype at = 0; at < text.size(); at += Chunk)
-        size += measure.appendToBuffer(scratch, text.mid(at, Chunk)) - scratch;
-    QByteArray bytes(size, Qt::Uninitialized);
-    QStringEncoder encode(QStringEncoder::Utf8);
-    char *end = bytes.data();
-    for (qsizetype at = 0; at < text.size(); at += Chunk)
-        end = encode.appendToBuffer(end, text.mid(at, Chunk));
-    Q_ASSERT(end == bytes.data() + size);
-    return bytes;
 }
 
 // Runs the pure file readers side by side. The calling thread reads the
@@ -208,17 +187,20 @@ public:
     }
 
     // A line already encoded, as the readers hand back their large sections.
-    void utf8(const QByteArray &line)
+    void section(CrvC_SectionBuffer &text)
     {
         if (m_lines++ > 0)
             add(QStringLiteral("\n"));
-        write(line);
-        if (m_cut)
-            return;
-        // Three bytes hold at least one UTF-16 unit, so this prefix decodes
-        // to more than the room left, a split last character past the cut.
-        const qsizetype room = PageTextLimit - m_text.size();
-        keep(QString::fromUtf8(line.constData(), qMin(line.size(), 3 * (room + 1))));
+        // The first slice is a megabyte or the whole text, more than the
+        // kept beginning can take; three bytes hold at least one UTF-16 unit,
+        // so a character split at the cut lies past the room left.
+        if (!text.drain([this](const QByteArray &slice) {
+                write(slice);
+                if (!m_cut)
+                    keep(QString::fromUtf8(slice.constData(),
+                                           qMin(slice.size(), 3 * (PageTextLimit - m_text.size() + 1))));
+            }))
+            m_open = false; // a section lost on the way: the page is not written
     }
 
     // True when the whole page is in place of the previous file.
@@ -374,7 +356,7 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
     // turn.
     const CrvC_ReportData start = m_data;
     CrvC_ReportData usage = start, macros = start, commands = start;
-    QByteArray history, help, cores, par, osim;
+    CrvC_SectionBuffer history, help, cores, par, osim;
     // Largest first: the usage XML for the calling thread, then what needs
     // most memory on the way, while the usage tables are still small.
     ReaderPool readers({
@@ -384,15 +366,14 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
             CrvC_CommandLog::checkFuseLog(fuseLog, commands);
             if (commands.commandHistory.isEmpty())
                 return;
-            const QString text = CrvC_CommandLog::commandLineHistorySection(commands);
+            CrvC_CommandLog::commandLineHistorySection(commands, history);
             commands.commandHistory.clear();
-            history = compactUtf8(text);
         },
-        [&] { cores = CrvC_CoresStatistics().sectionText(coresReport); },
-        [&] { help = compactUtf8(CrvC_HelpViewerData().sectionText()); },
+        [&] { CrvC_CoresStatistics().writeSection(coresReport, cores); },
+        [&] { help += QStringView(CrvC_HelpViewerData().sectionText()); },
         [&] { CrvC_SynthesisReport::readMacroStatistics(synthesisReport, macros); },
-        [&] { par = compactUtf8(CrvC_RunStatistics::parUsageSection(parPage)); },
-        [&] { osim = compactUtf8(CrvC_RunStatistics::osimUsageSection(osimPage)); },
+        [&] { par += QStringView(CrvC_RunStatistics::parUsageSection(parPage)); },
+        [&] { osim += QStringView(CrvC_RunStatistics::osimUsageSection(osimPage)); },
     });
 
     const QString fileName = QString::fromLatin1(ReportFileName);
@@ -431,13 +412,12 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
     m_data.reportPinData.clear();
 
     if (!history.isEmpty())
-        page.utf8(history);
-    history.clear();
+        page.section(history);
     page(runStatistics);
-    page.utf8(help);
+    page.section(help);
     page(projectStatistics);
-    page.utf8(cores);
-    page.utf8(par);
-    page.utf8(osim);
+    page.section(cores);
+    page.section(par);
+    page.section(osim);
     page(QStringLiteral("</BODY></HTML>"));
 }
