@@ -370,7 +370,7 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
             commands.commandHistory.clear();
         },
         [&] { CrvC_CoresStatistics().writeSection(coresReport, cores); },
-        [&] { help += QStringView(CrvC_HelpViewerData().sectionText()); },
+        [&] { CrvC_HelpViewerData().writeSection(help); },
         [&] { CrvC_SynthesisReport::readMacroStatistics(synthesisReport, macros); },
         [&] { par += QStringView(CrvC_RunStatistics::parUsageSection(parPage)); },
         [&] { osim += QStringView(CrvC_RunStatistics::osimUsageSection(osimPage)); },
