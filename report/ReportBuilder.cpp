@@ -5,6 +5,7 @@
 #include "PageStore.h"
 #include "ProjectStatistics.h"
 #include "RunStatistics.h"
+#include "SectionBuffer.h"
 #include "SynthesisReport.h"
 #include "UsageXml.h"
 #include "VersionSection.h"
@@ -191,13 +192,20 @@ public:
     }
 
     // A line already encoded, as the readers hand back their large sections.
-    void utf8(const QByteArray &line)
+    void section(CrvC_SectionBuffer &text)
     {
         if (m_lines++ > 0)
             add(QStringLiteral("\n"));
-        write(line);
-        if (!m_cut)
-            keep(QString::fromUtf8(line));
+        // The first slice is a megabyte or the whole text, more than the
+        // kept beginning can take; three bytes hold at least one UTF-16 unit,
+        // so a character split at the cut lies past the room left.
+        if (!text.drain([this](const QByteArray &slice) {
+                write(slice);
+                if (!m_cut)
+                    keep(QString::fromUtf8(slice.constData(),
+                                           qMin(slice.size(), 3 * (PageTextLimit - m_text.size() + 1))));
+            }))
+            m_open = false; // a section lost on the way: the page is not written
     }
 
     // True when every file is complete in place of its previous version.
@@ -389,7 +397,7 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
     // turn.
     const CrvC_ReportData start = m_data;
     CrvC_ReportData usage = start, macros = start, commands = start;
-    QByteArray history, help, cores, par, osim;
+    CrvC_SectionBuffer history, help, cores, par, osim;
     // Largest first: the usage XML for the calling thread, then what needs
     // most memory on the way, while the usage tables are still small.
     ReaderPool readers({
@@ -399,15 +407,14 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
             CrvC_CommandLog::checkFuseLog(fuseLog, commands);
             if (commands.commandHistory.isEmpty())
                 return;
-            const QString text = CrvC_CommandLog::commandLineHistorySection(commands);
+            CrvC_CommandLog::commandLineHistorySection(commands, history);
             commands.commandHistory.clear();
-            history = text.toUtf8();
         },
-        [&] { cores = CrvC_CoresStatistics().sectionText(coresReport).toUtf8(); },
-        [&] { help = CrvC_HelpViewerData().sectionText().toUtf8(); },
+        [&] { CrvC_CoresStatistics().writeSection(coresReport, cores); },
+        [&] { CrvC_HelpViewerData().writeSection(help); },
         [&] { CrvC_SynthesisReport::readMacroStatistics(synthesisReport, macros); },
-        [&] { par = CrvC_RunStatistics::parUsageSection(parPage).toUtf8(); },
-        [&] { osim = CrvC_RunStatistics::osimUsageSection(osimPage).toUtf8(); },
+        [&] { par += QStringView(CrvC_RunStatistics::parUsageSection(parPage)); },
+        [&] { osim += QStringView(CrvC_RunStatistics::osimUsageSection(osimPage)); },
     });
 
     const QString fileName = QString::fromLatin1(ReportFileName);
@@ -446,13 +453,12 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
     m_data.reportPinData.clear();
 
     if (!history.isEmpty())
-        page.utf8(history);
-    history.clear();
+        page.section(history);
     page(runStatistics);
-    page.utf8(help);
+    page.section(help);
     page(projectStatistics);
-    page.utf8(cores);
-    page.utf8(par);
-    page.utf8(osim);
+    page.section(cores);
+    page.section(par);
+    page.section(osim);
     page(QStringLiteral("</BODY></HTML>"));
 }
