@@ -15,6 +15,7 @@ enum VancurlStatus {
     UnreadableFile = 3,
     ConnectionFailed = 4,
     TlsFailed = 5,
+    TimeLimit = 9, // the whole transfer took longer than its limit
 };
 
 // "host" or "host:port" of `url`; the text itself when it is no address.
@@ -72,6 +73,8 @@ QString CrvC_SendFailure::cause(const Run &run)
         return tr("The certificate of the server %1 could not be verified.").arg(server);
     case UnreadableFile:
         return tr("The report could not be read.");
+    case TimeLimit:
+        return tr("The transfer to %1 took longer than its time limit.").arg(server);
     default:
         return tr("The transfer to %1 failed (exit status %2): %3").arg(server).arg(run.exitStatus).arg(reason);
     }

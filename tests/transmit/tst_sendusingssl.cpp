@@ -193,8 +193,10 @@ private Q_SLOTS:
                                    << inst << "" << 100 << "The connection to %1 timed out.";
         QTest::newRow("redirect answered") << none << false << QByteArray("echo 'vancurl: HTTP status 302' >&2; exit 8")
                                            << inst << "" << 100 << "The server %1 answered the address lookup with HTTP 302.";
-        QTest::newRow("unknown status") << none << false << QByteArray("echo 'vancurl: odd' >&2; exit 9") << inst
-                                        << "" << 100 << "The transfer to %1 failed (exit status 9): odd";
+        QTest::newRow("time limit") << none << false << QByteArray("echo 'vancurl: took longer' >&2; exit 9") << inst
+                                    << "" << 100 << "The transfer to %1 took longer than its time limit.";
+        QTest::newRow("unknown status") << none << false << QByteArray("echo 'vancurl: odd' >&2; exit 12") << inst
+                                        << "" << 100 << "The transfer to %1 failed (exit status 12): odd";
     }
 
     void sends()
