@@ -148,9 +148,9 @@ private Q_SLOTS:
         m_server.files.insert("/null.pac", script("return null;"));
         m_server.files.insert("/number.pac", script("return 8080;"));
         m_server.files.insert("/greedy.pac", script("var s = 'x'; while (true) s = s + s;"));
-        m_server.files.insert("/long.pac", script("var a = []; for (var i = 0; i < 100000; i++) a.push('PROXY h:1');"
+        m_server.files.insert("/long.pac", script("var a = []; for (var i = 0; i < 1000; i++) a.push('PROXY h:1');"
                                                   "return a.join('; ');"));
-        m_server.files.insert("/longhost.pac", script("return 'PROXY ' + new Array(100000).join('h');"));
+        m_server.files.insert("/longhost.pac", script("return 'PROXY ' + new Array(2000).join('h');"));
         m_server.start();
         m_server.ready.acquire();
         QVERIFY(m_server.port != 0);
@@ -198,7 +198,7 @@ private Q_SLOTS:
         // unbounded script takes in these seconds.
         rusage usage;
         QCOMPARE(getrusage(RUSAGE_CHILDREN, &usage), 0);
-        QVERIFY2(usage.ru_maxrss < 512 * 1024, qPrintable(QString::number(usage.ru_maxrss)));
+        QVERIFY2(usage.ru_maxrss < 1024 * 1024, qPrintable(QString::number(usage.ru_maxrss)));
     }
 
     void discovery_data()
@@ -265,6 +265,8 @@ private Q_SLOTS:
                  qPrintable(QString::number(driverGone)));
         QTRY_COMPARE_WITH_TIMEOUT(receiver.uploadFolders().size(), 1, 30000);
         QCOMPARE(receiver.upload(0).file, QByteArray("<html>report</html>"));
+        QTRY_VERIFY(!childPrograms().contains("vancurl")); // the upload releases itself
+        QTest::qWait(100);
     }
 };
 

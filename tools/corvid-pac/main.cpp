@@ -43,7 +43,6 @@ const char *const Usage =
     "no text at all (undefined, null, a number).\n";
 
 const long MaxScriptBytes = 1024 * 1024;
-const rlim_t MaxMemoryBytes = rlim_t(256) * 1024 * 1024;
 // With the line end this fits the 1024 bytes Corvid reads.
 const size_t MaxAnswerBytes = 1023;
 
@@ -88,7 +87,8 @@ void limitMemory()
 #ifndef CORVID_PAC_SANITIZED
     // A sanitizer reserves terabytes of address space up front; those builds
     // bound the program through hard_rss_limit_mb below instead.
-    const rlimit limit = {MaxMemoryBytes, MaxMemoryBytes};
+    const rlim_t maxBytes = rlim_t(256) * 1024 * 1024;
+    const rlimit limit = {maxBytes, maxBytes};
     setrlimit(RLIMIT_AS, &limit);
 #endif
 }
@@ -98,7 +98,8 @@ void limitMemory()
 #ifdef CORVID_PAC_SANITIZED
 extern "C" const char *__asan_default_options()
 {
-    return "hard_rss_limit_mb=256";
+    // A small quarantine keeps freed memory from counting against the limit.
+    return "hard_rss_limit_mb=512:quarantine_size_mb=32";
 }
 #endif
 
