@@ -83,11 +83,28 @@ int RegSection::getValue(const Port::StringBase &key, Port::StringBase &value)
 
 int RegSection::setValue(const Port::StringBase &key, const Port::StringBase &value)
 {
+    return replaceValue(key, nullptr, value, false);
+}
+
+int RegSection::replaceValue(const Port::StringBase &key, const Port::StringBase *expected,
+                             const Port::StringBase &value)
+{
+    return replaceValue(key, expected, value, true);
+}
+
+int RegSection::replaceValue(const Port::StringBase &key, const Port::StringBase *expected,
+                             const Port::StringBase &value, bool compare)
+{
     if (!(m_mode & ModeWrite))
         return StatusDenied;
     if (key.IsEmpty())
         return StatusFailed;
-    return m_store->setValue(m_id, String::convert(key), String::convert(value));
+    const QString old = expected ? String::convert(*expected) : QString();
+    return m_store->setValue(m_id, String::convert(key), String::convert(value),
+                             !compare                ? RepositoryStore::Replace
+                             : expected              ? RepositoryStore::IfEqual
+                                                     : RepositoryStore::IfAbsent,
+                             old);
 }
 
 } // namespace Prjrep
