@@ -3,6 +3,7 @@
 #include <QBuffer>
 #include <QStringDecoder>
 
+#include <array>
 #include <cstring>
 
 namespace Port {
@@ -194,13 +195,19 @@ public:
         const uchar *p = reinterpret_cast<const uchar *>(data);
         const uchar *const end = p + size;
         if (m_layout.width == 1) {
+            // The bulk of a document is text, start tags and values: only the
+            // characters that end them are looked at one by one.
             while (p < end) {
-                // The bulk of a document is text and values: skip them fast.
                 if (m_state == State::Text || m_state == State::Value) {
                     const void *found = std::memchr(p, m_state == State::Text ? '<' : m_quote, size_t(end - p));
                     if (!found)
                         return QString();
                     p = static_cast<const uchar *>(found);
+                } else if (m_state == State::StartTag) {
+                    while (p < end && !endsTagRun(*p))
+                        ++p;
+                    if (p == end)
+                        return QString();
                 }
                 if (!step(*p++))
                     return tooMany();
@@ -238,6 +245,18 @@ private:
         StartTag,
         Value, // quoted, in a start tag
     };
+
+    // The characters that matter inside a start tag.
+    static bool endsTagRun(uchar c)
+    {
+        static const auto table = [] {
+            std::array<bool, 256> t{};
+            for (uchar m : {'"', '\'', '>', '='})
+                t[m] = true;
+            return t;
+        }();
+        return table[c];
+    }
 
     static QString tooMany()
     {
