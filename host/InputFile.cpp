@@ -109,6 +109,7 @@ InputFile::Status InputFile::open(const QString &path, Kind kind, QString *reaso
     m_kind = kind;
     m_limit = sizeLimit(kind);
     m_position = 0;
+    m_pastLimit = false;
     m_refusal.clear();
 #ifdef Q_OS_UNIX
     // Opened without blocking, so that a pipe with no writer or a device does
@@ -190,6 +191,7 @@ qint64 InputFile::readData(char *data, qint64 maxSize)
         const qint64 n = QFile::readData(probe, sizeof probe);
         if (n == 0)
             return 0;
+        m_pastLimit = true;
         refuse(QStringLiteral("it reads past the limit of %1 bytes").arg(m_limit));
         return -1;
     }
@@ -260,10 +262,8 @@ InputFile::Status InputFile::readAll(const QString &path, Kind kind, QByteArray 
     if (file.readRest(bytes))
         return Status::Opened;
     if (reason)
-        *reason = file.errorString();
-    if (file.refused())
-        return Status::TooLarge;
-    return refusalOf(Status::Unreadable, path, kind, file.errorString(), nullptr);
+        *reason = file.refusal();
+    return file.m_pastLimit ? Status::TooLarge : Status::Unreadable;
 }
 
 bool InputFile::isAvailable(const QString &path, Kind kind)

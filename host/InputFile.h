@@ -94,7 +94,8 @@ public:
     bool atEnd() const override;
 
     // Reads the whole file; `bytes` is left empty unless the status is
-    // Opened. A file that reads past its limit is refused as TooLarge.
+    // Opened. A file that reads past its limit is refused as TooLarge, one
+    // whose reading fails half-way as Unreadable.
     static Status readAll(const QString &path, Kind kind, QByteArray &bytes,
                           QString *reason = nullptr);
 
@@ -110,6 +111,7 @@ private:
     Kind m_kind = KindCount;
     qint64 m_limit = 0;
     qint64 m_position = 0; // of the next byte readData() takes
+    bool m_pastLimit = false;
     QString m_refusal;
     Inspector m_inspector;
 };

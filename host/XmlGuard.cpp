@@ -458,10 +458,13 @@ XmlGuard::Outcome XmlGuard::guard(InputFile &file, QString *reason)
 {
     const Layout layout = layoutOf(file.peek(4));
     QString problem = prologProblem(file);
-    if (problem.isEmpty() && !file.seek(0))
+    if (file.refused())
+        problem = file.refusal(); // a prolog that reads past the limit
+    else if (problem.isEmpty() && !file.seek(0))
         problem = file.errorString();
     if (!problem.isEmpty()) {
-        file.refuse(problem);
+        if (!file.refused())
+            file.refuse(problem);
         file.close();
         if (reason)
             *reason = problem;
@@ -481,8 +484,8 @@ XmlGuard::Outcome XmlGuard::read(const QString &path, InputFile::Kind kind, QByt
         return outcome;
     if (!file.readRest(xml)) {
         if (reason)
-            *reason = file.errorString();
-        return file.refused() ? Outcome::Refused : Outcome::NotRead;
+            *reason = file.refusal();
+        return Outcome::Refused;
     }
     if (exceedsDepth(xml, maxDepth)) {
         file.refuse(QStringLiteral("elements nested too deeply"));

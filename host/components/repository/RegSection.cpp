@@ -83,28 +83,25 @@ int RegSection::getValue(const Port::StringBase &key, Port::StringBase &value)
 
 int RegSection::setValue(const Port::StringBase &key, const Port::StringBase &value)
 {
-    return replaceValue(key, nullptr, value, false);
+    return write(key, value, RepositoryStore::Replace, QString());
 }
 
 int RegSection::replaceValue(const Port::StringBase &key, const Port::StringBase *expected,
                              const Port::StringBase &value)
 {
-    return replaceValue(key, expected, value, true);
+    if (!expected)
+        return write(key, value, RepositoryStore::IfAbsent, QString());
+    return write(key, value, RepositoryStore::IfEqual, String::convert(*expected));
 }
 
-int RegSection::replaceValue(const Port::StringBase &key, const Port::StringBase *expected,
-                             const Port::StringBase &value, bool compare)
+int RegSection::write(const Port::StringBase &key, const Port::StringBase &value,
+                      RepositoryStore::Condition condition, const QString &expected)
 {
     if (!(m_mode & ModeWrite))
         return StatusDenied;
     if (key.IsEmpty())
         return StatusFailed;
-    const QString old = expected ? String::convert(*expected) : QString();
-    return m_store->setValue(m_id, String::convert(key), String::convert(value),
-                             !compare                ? RepositoryStore::Replace
-                             : expected              ? RepositoryStore::IfEqual
-                                                     : RepositoryStore::IfAbsent,
-                             old);
+    return m_store->setValue(m_id, String::convert(key), String::convert(value), condition, expected);
 }
 
 } // namespace Prjrep

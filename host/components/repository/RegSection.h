@@ -32,8 +32,8 @@ public:
     static int checkMode(int mode, bool storeWritable);
 
 private:
-    int replaceValue(const Port::StringBase &key, const Port::StringBase *expected,
-                     const Port::StringBase &value, bool compare);
+    int write(const Port::StringBase &key, const Port::StringBase &value,
+              RepositoryStore::Condition condition, const QString &expected);
 
     std::shared_ptr<RepositoryStore> m_store;
     qint64 m_id;
