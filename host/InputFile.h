@@ -107,6 +107,9 @@ protected:
     qint64 readLineData(char *data, qint64 maxSize) override;
 
 private:
+    // Only open(path, kind) opens an input.
+    using QFile::open;
+
     QString m_path;
     Kind m_kind = KindCount;
     qint64 m_limit = 0;
