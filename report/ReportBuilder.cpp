@@ -270,10 +270,14 @@ CrvC_ReportBuilder::Environment CrvC_ReportBuilder::withDefaults(Environment env
         environment.now = [] { return QDateTime::currentDateTime(); };
     if (!environment.newIdentifier)
         environment.newIdentifier = &Port::Identifier::newIdentifier;
-    if (!environment.randomId)
-        environment.randomId = &CrvC_Settings::randomId;
+    if (!environment.randomId) {
+        const bool keep = !environment.preview;
+        environment.randomId = [keep] { return CrvC_Settings::randomId(keep); };
+    }
     return environment;
 }
+
+CrvC_ReportBuilder::CrvC_ReportBuilder() : CrvC_ReportBuilder(Environment()) {}
 
 CrvC_ReportBuilder::CrvC_ReportBuilder(Environment environment)
     : m_env(withDefaults(std::move(environment)))
@@ -310,7 +314,7 @@ QString CrvC_ReportBuilder::projectFilePath(const QString &name)
 
 QString CrvC_ReportBuilder::projectIteration()
 {
-    return CrvC_VersionSection::projectIteration(m_data);
+    return CrvC_VersionSection::projectIteration(m_data, CrvC_VersionSection::repository(m_env));
 }
 
 void CrvC_ReportBuilder::createReport(const QString &projectFileArg, const QString &designName,
@@ -432,7 +436,7 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
     page(CrvC_VersionSection::versionSection(m_data, m_env));
     const QString runStatistics = CrvC_RunStatistics::runStatisticsSection(m_data.projectFileToOpen());
     const QString projectStatistics = CrvC_ProjectStatistics::projectStatisticsSection(
-        m_data.projectFileToOpen(), m_env.now().date());
+        m_data.projectFileToOpen(), m_env.now().date(), CrvC_VersionSection::repository(m_env));
     readers.finish();
 
     m_data.macroStatistics.swap(macros.macroStatistics);

@@ -48,16 +48,22 @@ public:
         // the send step sends, CrvC_PageStore); empty when none could be made.
         // Unset: the build keeps no copy, the page at reportPath is its page.
         std::function<QString()> pageFolder;
+        // A preview: what is stored is read, nothing is stored. The project
+        // repository is opened read-only (ProjectRepositoryValues::readOnly)
+        // and identifiers that do not exist yet are made for the page only.
+        bool preview = false;
     };
 
     // `environment` with the defaults for its unset clock and identifier
     // hooks: the local clock, Port::Identifier::newIdentifier and
-    // CrvC_Settings::randomId. The one place these defaults are chosen.
+    // CrvC_Settings::randomId (which stores what it makes unless `preview`).
+    // The one place these defaults are chosen.
     static Environment withDefaults(Environment environment);
 
     // reportPath := projectFilePath(ReportFileName), made absolute now: a
     // later change of the working directory does not move the page.
-    explicit CrvC_ReportBuilder(Environment environment = Environment());
+    CrvC_ReportBuilder();
+    explicit CrvC_ReportBuilder(Environment environment);
 
     // targetFamily := targetFamily, then buildReport.
     void createReport(const QString &projectFileArg, const QString &designName,
