@@ -1,0 +1,66 @@
+#pragma once
+
+#include "Store.h"
+
+#include <QString>
+
+#include <functional>
+
+// Reads received pages into the store: a page file, a receiver's upload
+// folder, or a folder searched for both (docs/backend.md). A page whose bytes
+// are stored already is skipped before it is read further; a page the reader
+// turns down is reported with its reason, leaves no rows, and is copied with
+// the reason beside it into the rejected folder when one is set.
+class CrvB_Ingest
+{
+public:
+    struct Counts
+    {
+        int ingested = 0;
+        int alreadyPresent = 0;
+        int rejected = 0;
+        int failed = 0; // the database refused: the page is neither stored nor at fault
+    };
+
+    // `say` receives one line for every page that is rejected or failed and
+    // every folder that is skipped.
+    CrvB_Ingest(CrvB_Store &store, std::function<void(const QString &line)> say);
+
+    // Where rejected pages are copied; empty (the default) copies nothing.
+    void setRejectedFolder(const QString &folder);
+    // Only the uploads whose folder number (or, for other pages, a digest of
+    // the file name) modulo `count` is `index`: so that `count` workers can
+    // share one folder without doing the same page twice.
+    void setShard(int index, int count);
+
+    // A page file, an upload folder, or a folder searched (not through
+    // symbolic links, not into dot folders or the rejected folder) for both.
+    void ingestPath(const QString &path);
+    // One page with what came beside it.
+    void ingestPage(const QString &pagePath, const CrvB_Store::Arrival &arrival);
+
+    const Counts &counts() const { return m_counts; }
+    // "ingested N, already present M, rejected K"
+    QString summary() const;
+
+    // The rejected folder beside an SQLite database file; empty for PostgreSQL.
+    static QString defaultRejectedFolder(const CrvB_DatabaseUrl &url);
+
+    // For corvid-receiver --ingest: stores the upload in `folder` into the
+    // database at `url` with a connection of its own (any thread may call
+    // it). False with `message` when the page was not stored; the upload's
+    // folder is never changed.
+    static bool ingestUpload(const QString &url, const QString &folder, QString *message);
+
+private:
+    void ingestFolder(const QString &folder, int depth);
+    bool inShard(const QString &name) const;
+    void reject(const QString &pagePath, const QByteArray &sha256, const QString &reason);
+
+    CrvB_Store &m_store;
+    std::function<void(const QString &)> m_say;
+    QString m_rejectedFolder;
+    int m_shardIndex = 0;
+    int m_shardCount = 1;
+    Counts m_counts;
+};
