@@ -170,19 +170,20 @@ void CrvB_Ingest::reject(const QString &pagePath, const QByteArray &sha256, cons
         m_say(QStringLiteral("cannot copy %1 to %2").arg(pagePath, m_rejectedFolder));
 }
 
-bool CrvB_Ingest::ingestUpload(const QString &url, const QString &folder, QString *message)
+std::string CrvB_Ingest::receiverIngest(const std::string &url, const std::string &dataDir, unsigned number)
 {
+    const QString name = QStringLiteral("%1").arg(number, 6, 10, QLatin1Char('0'));
+    QStringList lines;
     CrvB_Store store;
     QString error;
-    if (!store.open(url, false, &error)) {
-        *message = error;
-        return false;
+    if (store.open(QString::fromStdString(url), false, &error)) {
+        CrvB_Ingest ingest(store, [&lines](const QString &line) { lines.append(line); });
+        ingest.setRejectedFolder(defaultRejectedFolder(store.url()));
+        ingest.ingestPath(QString::fromStdString(dataDir) + QLatin1Char('/') + name);
+        lines.append(ingest.summary());
+    } else {
+        lines.append(QStringLiteral("failed: ") + error);
     }
-    QStringList lines;
-    CrvB_Ingest ingest(store, [&lines](const QString &line) { lines.append(line); });
-    ingest.setRejectedFolder(defaultRejectedFolder(store.url()));
-    ingest.ingestPath(folder);
-    lines.append(ingest.summary());
-    *message = lines.join(QLatin1String("; "));
-    return ingest.counts().ingested + ingest.counts().alreadyPresent > 0;
+    const QString line = QStringLiteral("ingest ") + name + QLatin1String(": ") + lines.join(QLatin1String("; "));
+    return line.toStdString();
 }

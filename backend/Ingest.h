@@ -5,6 +5,7 @@
 #include <QString>
 
 #include <functional>
+#include <string>
 
 // Reads received pages into the store: a page file, a receiver's upload
 // folder, or a folder searched for both (docs/backend.md). A page whose bytes
@@ -46,11 +47,12 @@ public:
     // The rejected folder beside an SQLite database file; empty for PostgreSQL.
     static QString defaultRejectedFolder(const CrvB_DatabaseUrl &url);
 
-    // For corvid-receiver --ingest: stores the upload in `folder` into the
-    // database at `url` with a connection of its own (any thread may call
-    // it). False with `message` when the page was not stored; the upload's
-    // folder is never changed.
-    static bool ingestUpload(const QString &url, const QString &folder, QString *message);
+    // For corvid-receiver --ingest: stores the upload numbered `number` in
+    // the receiver's `dataDir` into the database at `url`, with a connection
+    // of its own (any thread may call it), and answers the receiver's log
+    // line: "ingest NNNNNN: " and the outcome. The upload's folder is never
+    // changed, so a page that could not be stored stays for a later run.
+    static std::string receiverIngest(const std::string &url, const std::string &dataDir, unsigned number);
 
 private:
     void ingestFolder(const QString &folder, int depth);

@@ -1,6 +1,8 @@
 // corvid-receiver: answers the redirect lookup and stores uploaded usage
 // reports, over HTTPS. See docs/receiver.md for the storage layout.
 
+#include "backend/Ingest.h"
+
 #include <httplib.h>
 
 #include <errno.h>
@@ -28,7 +30,7 @@ const char redirectTopic[] = "corvidupload";
 
 const char usage[] =
     "Usage: corvid-receiver --listen ADDRESS --port PORT --data DIR --cert FILE --key FILE\n"
-    "                       [--max-bytes N] [--no-redirect]\n"
+    "                       [--max-bytes N] [--no-redirect] [--ingest URL]\n"
     "\n"
     "Serves, over HTTPS, the redirect page that names the upload address and the\n"
     "upload form that Corvid posts its usage reports to, and stores every accepted\n"
@@ -43,6 +45,9 @@ const char usage[] =
     "  --max-bytes N     Largest request body accepted (default 67108864, 64 MiB).\n"
     "  --no-redirect     The redirect page names no upload address (to try out a\n"
     "                    client's failure path).\n"
+    "  --ingest URL      After storing an upload, read it into the database URL\n"
+    "                    (see corvid-ingest --help); when that fails the upload stays\n"
+    "                    stored for a later corvid-ingest run.\n"
     "  -h, --help        Show this text.\n"
     "\n"
     "The first line on standard output is \"listening on https://ADDRESS:PORT\"; then\n"
@@ -185,7 +190,7 @@ std::string hostForPage(const httplib::Request &request, const std::string &fall
 
 int main(int argc, char **argv)
 {
-    std::string address, dataDir, certFile, keyFile;
+    std::string address, dataDir, certFile, keyFile, ingestUrl;
     long port = -1;
     unsigned long long maxBytes = 64ull * 1024 * 1024;
     bool redirect = true;
@@ -215,6 +220,8 @@ int main(int argc, char **argv)
             certFile = value;
         } else if (arg == "--key") {
             keyFile = value;
+        } else if (arg == "--ingest") {
+            ingestUrl = value;
         } else if (arg == "--max-bytes") {
             maxBytes = std::strtoull(value.c_str(), &end, 10);
             if (value.empty() || value[0] == '-' || *end || maxBytes == 0)
@@ -295,6 +302,8 @@ int main(int argc, char **argv)
             response.set_content("error: the report could not be stored\n", "text/plain");
             return;
         }
+        if (!ingestUrl.empty())
+            std::printf("%s\n", CrvB_Ingest::receiverIngest(ingestUrl, dataDir, number).c_str());
         response.set_content("Thank you: report " + std::to_string(number) + " received.\n", "text/plain");
     });
     server.set_logger([](const httplib::Request &request, const httplib::Response &response) {
