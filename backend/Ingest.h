@@ -1,7 +1,9 @@
 #pragma once
 
+#include "ReportRecord.h"
 #include "Store.h"
 
+#include <QElapsedTimer>
 #include <QString>
 
 #include <functional>
@@ -29,6 +31,10 @@ public:
 
     // Where rejected pages are copied; empty (the default) copies nothing.
     void setRejectedFolder(const QString &folder);
+    // Pages stored per transaction (default 200; 1 gives each page a
+    // transaction of its own). A batch is also committed after a quarter
+    // second, so a slow stream of pages does not wait in it.
+    void setCommitEvery(int pages);
     // Only the uploads whose folder number (or, for other pages, a digest of
     // the file name) modulo `count` is `index`: so that `count` workers can
     // share one folder without doing the same page twice.
@@ -39,6 +45,10 @@ public:
     void ingestPath(const QString &path);
     // One page with what came beside it.
     void ingestPage(const QString &pagePath, const CrvB_Store::Arrival &arrival);
+
+    // Commits the pages stored since the last commit; call before reading
+    // the counts. A batch that cannot be committed counts as failed.
+    void finish();
 
     const Counts &counts() const { return m_counts; }
     // "ingested N, already present M, rejected K"
@@ -58,6 +68,8 @@ private:
     void ingestFolder(const QString &folder, int depth);
     bool inShard(const QString &name) const;
     void reject(const QString &pagePath, const QByteArray &sha256, const QString &reason);
+    void store(const QString &pagePath, const QByteArray &sha256, qint64 bytes, const CrvB_ReportRecord &record,
+               const CrvB_Store::Arrival &arrival);
 
     CrvB_Store &m_store;
     std::function<void(const QString &)> m_say;
@@ -65,4 +77,7 @@ private:
     int m_shardIndex = 0;
     int m_shardCount = 1;
     Counts m_counts;
+    int m_commitEvery = 200;
+    int m_batchPages = 0; // stored in the open batch
+    QElapsedTimer m_batchAge;
 };

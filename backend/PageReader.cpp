@@ -1,13 +1,13 @@
 #include "PageReader.h"
 
+#include <QHash>
+
 #include <cstring>
 
 // The limits stand well above what the builder writes (docs/backend.md has
 // the measurements): the largest reference project gives a page of 21 MB with
 // 297,000 values, nested at most three deep.
 const qint64 CrvB_PageReader::MaxPageBytes = 64 * 1024 * 1024;
-const int CrvB_PageReader::MaxDepth = 16;
-const int CrvB_PageReader::MaxValues = 1000000;
 
 namespace {
 
@@ -96,7 +96,10 @@ int decodeReference(const char *text, qsizetype size, qsizetype at, QByteArray &
 class Parser
 {
 public:
-    explicit Parser(const QByteArray &page) : m_data(page.constData()), m_size(page.size()) {}
+    Parser(const QByteArray &page, const CrvB_PageReader::Limits &limits)
+        : m_data(page.constData()), m_size(page.size()), m_limits(limits)
+    {
+    }
 
     CrvB_PageReader::Result run()
     {
@@ -171,14 +174,27 @@ private:
             ++nameEnd;
         const bool dtag = nameEnd - nameStart > 5 && qstrnicmp(m_data + nameStart, "dtag-", 5) == 0;
         if (!dtag) {
-            const qsizetype end = find(">", nameEnd);
-            if (end < 0) {
+            // Values are written without escaping: "a<b=1</dtag-item1>" holds
+            // a "<" that opens no tag, seen by the next "<" coming before a ">".
+            qsizetype end = nameEnd;
+            while (end < m_size && m_data[end] != '>' && m_data[end] != '<')
+                ++end;
+            if (end < m_size && m_data[end] == '<') {
+                text(at, at + 1);
+                return at + 1;
+            }
+            if (end >= m_size) {
                 reject(QStringLiteral("mark-up cut off: a tag is never closed"));
                 return m_size;
             }
             return end + 1;
         }
-        const QString tag = QString::fromLatin1(m_data + nameStart, nameEnd - nameStart).toLower();
+        // One copy of each element name, shared by all its values.
+        const QByteArray key = QByteArray::fromRawData(m_data + nameStart, nameEnd - nameStart);
+        auto known = m_tags.constFind(key);
+        if (known == m_tags.cend())
+            known = m_tags.insert(QByteArray(key), QString::fromLatin1(key).toLower());
+        const QString tag = known.value();
         Open element;
         element.tag = tag;
         bool selfClosing = false;
@@ -247,8 +263,8 @@ private:
 
     void open(Open &element, bool selfClosing)
     {
-        if (m_open.size() >= CrvB_PageReader::MaxDepth) {
-            reject(QStringLiteral("dtag elements nested deeper than %1").arg(CrvB_PageReader::MaxDepth));
+        if (m_open.size() >= m_limits.maxDepth) {
+            reject(QStringLiteral("dtag elements nested deeper than %1").arg(m_limits.maxDepth));
             return;
         }
         if (!m_open.isEmpty())
@@ -277,8 +293,8 @@ private:
 
     void emitValue(const Open &element)
     {
-        if (m_result.values.size() >= CrvB_PageReader::MaxValues) {
-            reject(QStringLiteral("more than %1 values").arg(CrvB_PageReader::MaxValues));
+        if (m_result.values.size() >= m_limits.maxValues) {
+            reject(QStringLiteral("more than %1 values").arg(m_limits.maxValues));
             return;
         }
         CrvB_PageReader::Value value;
@@ -293,9 +309,11 @@ private:
 
     const char *m_data;
     qsizetype m_size;
+    const CrvB_PageReader::Limits m_limits;
     QVector<Open> m_open;
     QByteArray m_text; // the text of the innermost open element while it is a leaf
     QStringList m_path; // the open elements as a value's path shows them
+    QHash<QByteArray, QString> m_tags;
     int m_opened = 0;
     CrvB_PageReader::Result m_result;
 };
@@ -304,16 +322,21 @@ private:
 
 CrvB_PageReader::Result CrvB_PageReader::read(const QByteArray &page)
 {
+    return read(page, Limits());
+}
+
+CrvB_PageReader::Result CrvB_PageReader::read(const QByteArray &page, const Limits &limits)
+{
     Result result;
-    if (page.size() > MaxPageBytes) {
-        result.rejection = QStringLiteral("larger than %1 bytes").arg(MaxPageBytes);
+    if (page.size() > limits.maxBytes) {
+        result.rejection = QStringLiteral("larger than %1 bytes").arg(limits.maxBytes);
         return result;
     }
     if (!page.isValidUtf8() || page.contains('\0')) {
         result.rejection = QStringLiteral("not UTF-8 text");
         return result;
     }
-    return Parser(page.startsWith("\xEF\xBB\xBF") ? page.mid(3) : page).run();
+    return Parser(page.startsWith("\xEF\xBB\xBF") ? page.mid(3) : page, limits).run();
 }
 
 QString CrvB_PageReader::decodeEntities(const QByteArray &utf8)

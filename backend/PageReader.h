@@ -13,16 +13,21 @@
 // Pages come from the internet, so the reader trusts nothing: it works on a
 // copy of the bytes, needs no more memory than a few times the page, and
 // turns down (with a reason) every page it cannot read exactly: not UTF-8,
-// larger than MaxPageBytes, dtag elements deeper than MaxDepth, more than
-// MaxValues values, mark-up cut off (a tag, comment or dtag element that is
+// larger, deeper or with more values than its limits, mark-up cut off (a tag, comment or dtag element that is
 // never closed), a closing tag that closes another element than the one open,
 // or no values at all.
 class CrvB_PageReader
 {
 public:
+    // The limits of a page the reader takes (docs/backend.md tells how they
+    // were chosen).
     static const qint64 MaxPageBytes;
-    static const int MaxDepth;
-    static const int MaxValues;
+    struct Limits
+    {
+        qint64 maxBytes = MaxPageBytes;
+        int maxDepth = 16;       // dtag elements within each other
+        int maxValues = 2000000;
+    };
 
     struct Value
     {
@@ -41,7 +46,8 @@ public:
         bool ok() const { return rejection.isEmpty(); }
     };
 
-    static Result read(const QByteArray &page);
+    static Result read(const QByteArray &page); // with the default limits
+    static Result read(const QByteArray &page, const Limits &limits);
 
     // The values as the JSON object corvid-ingest --print shows:
     // {"values": [{"tag", "name" (or null), "value", "path"}, ...]}.

@@ -8,25 +8,52 @@ namespace {
 
 using Value = CrvB_PageReader::Value;
 
-// Elements that come in pairs on the page: the first's value is always
-// followed at once by the second's.
-const QHash<QString, QString> &pairs()
-{
-    static const QHash<QString, QString> map = {
-        {QStringLiteral("dtag-core-param-name"), QStringLiteral("dtag-core-param-value")},
-        {QStringLiteral("dtag-design-property-name"), QStringLiteral("dtag-design-property-value")},
-        {QStringLiteral("dtag-process-property-name"), QStringLiteral("dtag-process-property-value")},
-        {QStringLiteral("dtag-design-source-type-name"), QStringLiteral("dtag-design-source-type-count")},
-        {QStringLiteral("dtag-search-item"), QStringLiteral("dtag-count-property")},
-    };
-    return map;
-}
+// What each element of the page is to the store. Elements of the pairs come
+// one after the other: the first's value is always followed at once by the
+// second's.
+enum class Kind { Other, PairFirst, PairSecond, Property, GroupName, Item, CommandLine, CoreType, RunTool, RunField };
 
-const QString runPrefix = QStringLiteral("dtag-run-");
-const QStringList runFields = {QStringLiteral("count"),         QStringLiteral("completed"),
-                               QStringLiteral("failed"),        QStringLiteral("cancelled"),
-                               QStringLiteral("total-seconds"), QStringLiteral("average-seconds"),
-                               QStringLiteral("last-date")};
+struct Role
+{
+    Kind kind = Kind::Other;
+    int index = 0; // the pair, the item level or the run field
+};
+
+const char *const pairNames[][2] = {
+    {"dtag-core-param-name", "dtag-core-param-value"},
+    {"dtag-design-property-name", "dtag-design-property-value"},
+    {"dtag-process-property-name", "dtag-process-property-value"},
+    {"dtag-design-source-type-name", "dtag-design-source-type-count"},
+    {"dtag-search-item", "dtag-count-property"},
+};
+enum Pair { CoreParameter, DesignProperty, ProcessProperty, SourceType, HelpEntry };
+
+// The run statistics fields after "dtag-run-tool", in the order of CrvB_ReportRecord::Run.
+const char *const runFieldNames[] = {"dtag-run-count",         "dtag-run-completed",      "dtag-run-failed",
+                                     "dtag-run-cancelled",     "dtag-run-total-seconds", "dtag-run-average-seconds",
+                                     "dtag-run-last-date"};
+
+Role roleOf(const QString &tag)
+{
+    static const QHash<QString, Role> roles = [] {
+        QHash<QString, Role> map;
+        for (int i = 0; i < 5; ++i) {
+            map.insert(QLatin1String(pairNames[i][0]), {Kind::PairFirst, i});
+            map.insert(QLatin1String(pairNames[i][1]), {Kind::PairSecond, i});
+        }
+        for (int i = 0; i < 7; ++i)
+            map.insert(QLatin1String(runFieldNames[i]), {Kind::RunField, i});
+        for (int level = 1; level <= 3; ++level)
+            map.insert(QStringLiteral("dtag-item%1").arg(level), {Kind::Item, level});
+        map.insert(QStringLiteral("dtag-property"), {Kind::Property, 0});
+        map.insert(QStringLiteral("dtag-group-name"), {Kind::GroupName, 0});
+        map.insert(QStringLiteral("dtag-cmdline"), {Kind::CommandLine, 0});
+        map.insert(QStringLiteral("dtag-core-type-name"), {Kind::CoreType, 0});
+        map.insert(QStringLiteral("dtag-run-tool"), {Kind::RunTool, 0});
+        return map;
+    }();
+    return roles.value(tag);
+}
 
 QString section(const Value &value)
 {
@@ -54,58 +81,57 @@ public:
 
     bool add(const Value &v, const Value *next, QString *reason)
     {
+        const Role role = roleOf(v.tag);
         const QString text = v.value.trimmed();
-        const auto pair = pairs().constFind(v.tag);
-        if (pair != pairs().cend() && (!next || next->tag != pair.value()))
-            return fail(reason, QStringLiteral("<%1> is not followed by <%2>").arg(v.tag, pair.value()));
-        if (m_pairSecond == v.tag) {
-            m_pairSecond.clear();
-            return true; // taken with its first
-        }
-        for (auto it = pairs().cbegin(); it != pairs().cend(); ++it)
-            if (it.value() == v.tag)
-                return fail(reason, QStringLiteral("<%1> does not follow <%2>").arg(v.tag, it.key()));
-        if (pair != pairs().cend()) {
-            m_pairSecond = pair.value();
-            pairOf(v, text, next->value.trimmed());
+        switch (role.kind) {
+        case Kind::PairFirst:
+            if (!next || next->tag != QLatin1String(pairNames[role.index][1]))
+                return fail(reason, QStringLiteral("<%1> is not followed by <%2>")
+                                        .arg(v.tag, QLatin1String(pairNames[role.index][1])));
+            pairOf(Pair(role.index), v, text, next->value.trimmed());
+            m_pairTaken = true;
             return true;
-        }
-
-        if (v.tag == QLatin1String("dtag-property") && v.hasName) {
-            if (!m_properties.contains(v.name)) {
-                m_properties.insert(v.name);
-                const auto column = CrvB_ReportRecord::propertyColumns().constFind(v.name);
-                if (column == CrvB_ReportRecord::propertyColumns().cend())
-                    other(v, text);
-                else
-                    r.properties.insert(column.value(), text);
-                return true;
-            }
-            return fail(reason, QStringLiteral("the property \"%1\" is given twice").arg(v.name));
-        }
-        if (v.tag == QLatin1String("dtag-group-name"))
+        case Kind::PairSecond:
+            if (!m_pairTaken)
+                return fail(reason, QStringLiteral("<%1> does not follow <%2>")
+                                        .arg(v.tag, QLatin1String(pairNames[role.index][0])));
+            m_pairTaken = false;
+            return true;
+        case Kind::Property:
+            if (!v.hasName)
+                break;
+            if (m_properties.contains(v.name))
+                return fail(reason, QStringLiteral("the property \"%1\" is given twice").arg(v.name));
+            m_properties.insert(v.name);
+            if (CrvB_ReportRecord::propertyColumns().contains(v.name))
+                r.properties.insert(CrvB_ReportRecord::propertyColumns().value(v.name), text);
+            else
+                other(v, text);
+            return true;
+        case Kind::GroupName:
             return groupName(v, text, reason);
-        if (v.tag.startsWith(QLatin1String("dtag-item")) && m_groupOfElement.contains(v.parent)) {
-            bool ok = false;
-            const int level = v.tag.mid(9).toInt(&ok);
-            if (ok && level >= 1 && level <= 3) {
-                const int split = text.indexOf(QLatin1Char('='));
-                r.items.append({m_groupOfElement.value(v.parent), level, split < 0 ? text : text.left(split),
-                                split < 0 ? QString() : text.mid(split + 1)});
-                return true;
-            }
-        }
-        if (v.tag == QLatin1String("dtag-cmdline")) {
+        case Kind::Item:
+            if (!m_groupOfElement.contains(v.parent))
+                break;
+            item(m_groupOfElement.value(v.parent), role.index, text);
+            return true;
+        case Kind::CommandLine:
             r.commandLines.append({text.section(QLatin1Char(' '), 0, 0, QString::SectionSkipEmpty), text,
                                    optionsOf(text)});
             return true;
-        }
-        if (v.tag == QLatin1String("dtag-core-type-name")) {
+        case Kind::CoreType:
             r.cores.append(text);
             return true;
+        case Kind::RunTool:
+            r.runs.append(CrvB_ReportRecord::Run());
+            r.runs.last().tool = text;
+            m_runFields = 0;
+            return true;
+        case Kind::RunField:
+            return runField(role.index, text, reason, v);
+        case Kind::Other:
+            break;
         }
-        if (v.tag.startsWith(runPrefix))
-            return run(v.tag.mid(runPrefix.size()), text, reason, v);
         other(v, text);
         return true;
     }
@@ -124,22 +150,33 @@ private:
                          v.path.join(QLatin1Char('/')), text});
     }
 
-    void pairOf(const Value &v, const QString &first, const QString &second)
+    void pairOf(Pair pair, const Value &v, const QString &first, const QString &second)
     {
-        const QString &tag = v.tag;
-        if (tag == QLatin1String("dtag-core-param-name")) {
+        switch (pair) {
+        case CoreParameter:
             if (r.cores.isEmpty())
                 r.cores.append(QString());
             r.coreParameters.append({int(r.cores.size()) - 1, first, second});
-        } else if (tag == QLatin1String("dtag-design-property-name")) {
+            break;
+        case DesignProperty:
             r.projectProperties.append({QStringLiteral("design"), first, second});
-        } else if (tag == QLatin1String("dtag-process-property-name")) {
+            break;
+        case ProcessProperty:
             r.projectProperties.append({QStringLiteral("process"), first, second});
-        } else if (tag == QLatin1String("dtag-design-source-type-name")) {
+            break;
+        case SourceType:
             r.sourceTypes.append({first, CrvB_ReportRecord::integer(second)});
-        } else {
+            break;
+        case HelpEntry:
             r.helpEntries.append({m_helpList.value(v.parent), first, CrvB_ReportRecord::integer(second)});
+            break;
         }
+    }
+
+    void item(int group, int level, const QString &text)
+    {
+        const int split = int(text.indexOf(QLatin1Char('=')));
+        r.items.append({group, level, split < 0 ? text : text.left(split), split < 0 ? QString() : text.mid(split + 1)});
     }
 
     // A group's name: the help lists keep the key in the name attribute, the
@@ -160,38 +197,29 @@ private:
         return true;
     }
 
-    bool run(const QString &field, const QString &text, QString *reason, const Value &v)
+    bool runField(int field, const QString &text, QString *reason, const Value &v)
     {
-        if (field == QLatin1String("tool")) {
-            r.runs.append(CrvB_ReportRecord::Run());
-            r.runs.last().tool = text;
-            m_runFields.clear();
-            return true;
-        }
-        if (!runFields.contains(field)) {
-            other(v, text);
-            return true;
-        }
-        if (r.runs.isEmpty() || m_runFields.contains(field))
+        if (r.runs.isEmpty() || (m_runFields & (1u << field)))
             return fail(reason, QStringLiteral("<%1> out of place").arg(v.tag));
-        m_runFields.insert(field);
+        m_runFields |= 1u << field;
         CrvB_ReportRecord::Run &row = r.runs.last();
-        const int index = runFields.indexOf(field);
-        QVariant *const columns[] = {&row.runs,         &row.completed,      &row.failed, &row.cancelled,
-                                   &row.totalSeconds, &row.averageSeconds, nullptr};
-        if (columns[index])
-            *columns[index] = index >= 4 ? CrvB_ReportRecord::number(text) : CrvB_ReportRecord::integer(text);
+        QVariant *const numbers[] = {&row.runs,         &row.completed,      &row.failed, &row.cancelled,
+                                     &row.totalSeconds, &row.averageSeconds};
+        if (field < 4)
+            *numbers[field] = CrvB_ReportRecord::integer(text);
+        else if (field < 6)
+            *numbers[field] = CrvB_ReportRecord::number(text);
         else
             row.lastRun = text;
         return true;
     }
 
     CrvB_ReportRecord &r;
-    QString m_pairSecond;             // the second of a pair whose first was just taken
+    bool m_pairTaken = false;         // the value before was the first of a pair
     QSet<QString> m_properties;       // property names seen
     QHash<int, int> m_groupOfElement; // dtag-group element -> index into groups
     QHash<int, QString> m_helpList;   // help dtag-group element -> its list name
-    QSet<QString> m_runFields;        // fields of the current run row
+    uint m_runFields = 0;             // fields of the current run row, one bit each
 };
 
 } // namespace

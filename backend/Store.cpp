@@ -23,15 +23,97 @@ QVariant textOrNull(const QString &text)
     return text.isNull() ? QVariant() : QVariant(text);
 }
 
+// The rows of one table for one page, written with as few statements as
+// possible: inserts of 32, 16, ... 1 rows at a time, each prepared once.
+class RowWriter
+{
+public:
+    RowWriter(const QSqlDatabase &db, const QString &table, const QStringList &columns)
+        : m_db(db), m_head(QStringLiteral("INSERT INTO %1 (report_id, %2) VALUES ")
+                               .arg(table, columns.join(QLatin1String(", ")))),
+          m_width(int(columns.size()) + 1)
+    {
+    }
+
+    void add(std::initializer_list<QVariant> values)
+    {
+        m_values.append(QVariant()); // the report's key, known when written
+        m_values.append(values);
+    }
+
+    bool write(qlonglong reportId, QString *error)
+    {
+        const int rows = int(m_values.size()) / m_width;
+        int done = 0;
+        for (int chunk = MaxRows; chunk >= 1; chunk /= 2) {
+            for (; rows - done >= chunk; done += chunk) {
+                QSqlQuery &query = statement(chunk);
+                for (int i = 0; i < chunk * m_width; ++i)
+                    query.bindValue(i, i % m_width == 0 ? QVariant(reportId)
+                                                        : bindable(m_values.at(done * m_width + i)));
+                if (!query.exec()) {
+                    *error = errorText(query.lastError());
+                    clear();
+                    return false;
+                }
+            }
+        }
+        clear();
+        return true;
+    }
+
+    void clear() { m_values.clear(); }
+
+private:
+    static const int MaxRows = 32;
+
+    // A text column is never bound NULL by accident: QtSql binds a null
+    // QString as NULL, and a page's empty values are texts.
+    static QVariant bindable(const QVariant &value)
+    {
+        return value.typeId() == QMetaType::QString && value.toString().isNull() ? QVariant(QLatin1String(""))
+                                                                                 : value;
+    }
+
+    QSqlQuery &statement(int rows)
+    {
+        std::unique_ptr<QSqlQuery> &query = m_statements[rows];
+        if (!query) {
+            const QString row = QLatin1Char('(') + QStringList(m_width, QStringLiteral("?")).join(QLatin1Char(','))
+                + QLatin1Char(')');
+            query.reset(new QSqlQuery(m_db));
+            query->prepare(m_head + QStringList(rows, row).join(QLatin1Char(',')));
+        }
+        return *query;
+    }
+
+    QSqlDatabase m_db;
+    QString m_head;
+    int m_width;
+    QVariantList m_values;
+    std::map<int, std::unique_ptr<QSqlQuery>> m_statements;
+};
+
 } // namespace
 
-// The prepared insert of every table, made once per connection.
+// The statements of one connection: the report's insert, the lookup by
+// digest and a row writer per table.
 class CrvB_Store::Statements
 {
 public:
     explicit Statements(const QSqlDatabase &db)
-        : report(db), group(db), item(db), commandLine(db), option(db), run(db), help(db), core(db),
-          parameter(db), property(db), sourceType(db), other(db), find(db)
+        : report(db), find(db), group(db, "usage_group", {"group_no", "section", "name"}),
+          item(db, "usage_item", {"item_no", "group_no", "level", "name", "value"}),
+          commandLine(db, "command_line", {"line_no", "tool", "command_line"}),
+          option(db, "command_option", {"line_no", "option_name"}),
+          run(db, "run_statistic",
+              {"row_no", "tool", "runs", "completed", "failed", "cancelled", "total_seconds", "average_seconds",
+               "last_run"}),
+          help(db, "help_entry", {"entry_no", "list", "term", "hits"}), core(db, "core", {"core_no", "core_type"}),
+          parameter(db, "core_parameter", {"parameter_no", "core_no", "name", "value"}),
+          property(db, "project_property", {"property_no", "kind", "name", "value"}),
+          sourceType(db, "source_type", {"type_no", "source_type", "files"}),
+          other(db, "page_value", {"value_no", "tag", "name", "path", "value"})
     {
     }
 
@@ -41,61 +123,20 @@ public:
         columns += CrvB_ReportRecord::propertyColumns().values();
         columns += {QStringLiteral("received_at"), QStringLiteral("domain"), QStringLiteral("regid"),
                     QStringLiteral("source"), QStringLiteral("ingested_at")};
-        reportColumns = columns;
-        return prepare(report, QLatin1String("report"), columns, QStringLiteral(" RETURNING id"))
-            && prepare(group, "usage_group", {"group_no", "section", "name"})
-            && prepare(item, "usage_item", {"item_no", "group_no", "level", "name", "value"})
-            && prepare(commandLine, "command_line", {"line_no", "tool", "command_line"})
-            && prepare(option, "command_option", {"line_no", "option_name"})
-            && prepare(run, "run_statistic",
-                       {"row_no", "tool", "runs", "completed", "failed", "cancelled", "total_seconds",
-                        "average_seconds", "last_run"})
-            && prepare(help, "help_entry", {"entry_no", "list", "term", "hits"})
-            && prepare(core, "core", {"core_no", "core_type"})
-            && prepare(parameter, "core_parameter", {"parameter_no", "core_no", "name", "value"})
-            && prepare(property, "project_property", {"property_no", "kind", "name", "value"})
-            && prepare(sourceType, "source_type", {"type_no", "source_type", "files"})
-            && prepare(other, "page_value", {"value_no", "tag", "name", "path", "value"})
+        return report.prepare(QStringLiteral("INSERT INTO report (%1) VALUES (%2) RETURNING id")
+                                  .arg(columns.join(QLatin1String(", ")),
+                                       QStringList(columns.size(), QStringLiteral("?")).join(QLatin1String(", "))))
             && find.prepare(QStringLiteral("SELECT 1 FROM report WHERE sha256 = ?"));
     }
 
-    // Runs a child-table insert for the report `id` with `values`.
-    static bool insert(QSqlQuery &query, qlonglong id, std::initializer_list<QVariant> values)
+    // In the order they are written.
+    QVector<RowWriter *> writers()
     {
-        query.bindValue(0, id);
-        int i = 1;
-        // A text column is never bound NULL by accident: QtSql binds a null
-        // QString as NULL, and the page's empty values are texts.
-        for (const QVariant &value : values)
-            query.bindValue(i++, value.typeId() == QMetaType::QString && value.toString().isNull()
-                                     ? QVariant(QLatin1String(""))
-                                     : value);
-        return query.exec();
+        return {&group, &item, &commandLine, &option, &run, &help, &core, &parameter, &property, &sourceType, &other};
     }
 
-    QSqlQuery report, group, item, commandLine, option, run, help, core, parameter, property, sourceType,
-        other, find;
-    QStringList reportColumns;
-
-private:
-    static bool prepare(QSqlQuery &query, const QString &table, const QStringList &columns,
-                        const QString &tail = QString())
-    {
-        QStringList marks;
-        for (int i = 0; i < columns.size(); ++i)
-            marks.append(QStringLiteral("?"));
-        return query.prepare(QStringLiteral("INSERT INTO %1 (%2) VALUES (%3)%4")
-                                 .arg(table, columns.join(QLatin1String(", ")), marks.join(QLatin1String(", ")),
-                                      tail));
-    }
-
-    static bool prepare(QSqlQuery &query, const char *table, std::initializer_list<const char *> columns)
-    {
-        QStringList list{QStringLiteral("report_id")};
-        for (const char *column : columns)
-            list.append(QLatin1String(column));
-        return prepare(query, QLatin1String(table), list);
-    }
+    QSqlQuery report, find;
+    RowWriter group, item, commandLine, option, run, help, core, parameter, property, sourceType, other;
 };
 
 CrvB_Store::CrvB_Store()
@@ -214,6 +255,37 @@ bool CrvB_Store::createSchema(QString *error)
     return false;
 }
 
+bool CrvB_Store::exec(const char *sql)
+{
+    QSqlQuery query(database());
+    return query.exec(QLatin1String(sql));
+}
+
+bool CrvB_Store::beginBatch(QString *error)
+{
+    QSqlDatabase db = database();
+    m_inBatch = db.transaction();
+    if (!m_inBatch)
+        *error = errorText(db.lastError());
+    return m_inBatch;
+}
+
+bool CrvB_Store::commitBatch(QString *error)
+{
+    QSqlDatabase db = database();
+    const bool lost = m_batchLost || !m_inBatch;
+    m_inBatch = m_batchLost = false;
+    if (lost) {
+        *error = QStringLiteral("the batch was rolled back");
+        return false;
+    }
+    if (db.commit())
+        return true;
+    *error = errorText(db.lastError());
+    db.rollback();
+    return false;
+}
+
 bool CrvB_Store::contains(const QByteArray &sha256, QString *error)
 {
     QSqlQuery &find = m_statements->find;
@@ -232,13 +304,11 @@ CrvB_Store::Outcome CrvB_Store::store(const QByteArray &sha256, qint64 pageBytes
 {
     Statements &s = *m_statements;
     QSqlDatabase db = database();
-    QSqlQuery *failed = nullptr;
-    auto run = [&](QSqlQuery &query, bool ok) {
-        if (!ok && !failed)
-            failed = &query;
-        return ok;
-    };
-    if (!db.transaction()) {
+    if (m_batchLost) {
+        *error = QStringLiteral("the batch was rolled back");
+        return Outcome::Failed;
+    }
+    if (m_inBatch ? !exec("SAVEPOINT page") : !db.transaction()) {
         *error = errorText(db.lastError());
         return Outcome::Failed;
     }
@@ -247,63 +317,73 @@ CrvB_Store::Outcome CrvB_Store::store(const QByteArray &sha256, qint64 pageBytes
     for (const QString &column : CrvB_ReportRecord::propertyColumns().values())
         reportValues.append(textOrNull(record.properties.value(column)));
     reportValues += {textOrNull(arrival.receivedAt), textOrNull(arrival.domain), textOrNull(arrival.regid),
-                     textOrNull(arrival.source),
-                     QDateTime::currentDateTimeUtc().toString(Qt::ISODate)};
+                     textOrNull(arrival.source), QDateTime::currentDateTimeUtc().toString(Qt::ISODate)};
     for (int i = 0; i < reportValues.size(); ++i)
         s.report.bindValue(i, reportValues.at(i));
-    qlonglong id = -1;
-    if (run(s.report, s.report.exec() && s.report.next()))
-        id = s.report.value(0).toLongLong();
+    bool ok = s.report.exec() && s.report.next();
+    const qlonglong id = ok ? s.report.value(0).toLongLong() : -1;
+    if (!ok)
+        *error = errorText(s.report.lastError());
     s.report.finish();
 
-    for (int i = 0; !failed && i < record.groups.size(); ++i) {
-        const auto &g = record.groups.at(i);
-        run(s.group, Statements::insert(s.group, id, {i, g.section, g.name}));
-    }
-    for (int i = 0; !failed && i < record.items.size(); ++i) {
+    for (int i = 0; i < record.groups.size(); ++i)
+        s.group.add({i, record.groups.at(i).section, record.groups.at(i).name});
+    for (int i = 0; i < record.items.size(); ++i) {
         const auto &item = record.items.at(i);
-        run(s.item, Statements::insert(s.item, id, {i, item.group, item.level, item.name, item.value}));
+        s.item.add({i, item.group, item.level, item.name, item.value});
     }
-    for (int i = 0; !failed && i < record.commandLines.size(); ++i) {
+    for (int i = 0; i < record.commandLines.size(); ++i) {
         const auto &line = record.commandLines.at(i);
-        run(s.commandLine, Statements::insert(s.commandLine, id, {i, line.tool, line.text}));
+        s.commandLine.add({i, line.tool, line.text});
         for (const QString &option : line.options)
-            if (!failed)
-                run(s.option, Statements::insert(s.option, id, {i, option}));
+            s.option.add({i, option});
     }
-    for (int i = 0; !failed && i < record.runs.size(); ++i) {
+    for (int i = 0; i < record.runs.size(); ++i) {
         const auto &r = record.runs.at(i);
-        run(s.run, Statements::insert(s.run, id,
-                                      {i, r.tool, r.runs, r.completed, r.failed, r.cancelled, r.totalSeconds,
-                                       r.averageSeconds, textOrNull(r.lastRun)}));
+        s.run.add({i, r.tool, r.runs, r.completed, r.failed, r.cancelled, r.totalSeconds, r.averageSeconds,
+                   textOrNull(r.lastRun)});
     }
-    for (int i = 0; !failed && i < record.helpEntries.size(); ++i) {
+    for (int i = 0; i < record.helpEntries.size(); ++i) {
         const auto &h = record.helpEntries.at(i);
-        run(s.help, Statements::insert(s.help, id, {i, h.list, h.term, h.count}));
+        s.help.add({i, h.list, h.term, h.count});
     }
-    for (int i = 0; !failed && i < record.cores.size(); ++i)
-        run(s.core, Statements::insert(s.core, id, {i, record.cores.at(i)}));
-    for (int i = 0; !failed && i < record.coreParameters.size(); ++i) {
+    for (int i = 0; i < record.cores.size(); ++i)
+        s.core.add({i, record.cores.at(i)});
+    for (int i = 0; i < record.coreParameters.size(); ++i) {
         const auto &p = record.coreParameters.at(i);
-        run(s.parameter, Statements::insert(s.parameter, id, {i, p.core, p.name, p.value}));
+        s.parameter.add({i, p.core, p.name, p.value});
     }
-    for (int i = 0; !failed && i < record.projectProperties.size(); ++i) {
+    for (int i = 0; i < record.projectProperties.size(); ++i) {
         const auto &p = record.projectProperties.at(i);
-        run(s.property, Statements::insert(s.property, id, {i, p.kind, p.name, p.value}));
+        s.property.add({i, p.kind, p.name, p.value});
     }
-    for (int i = 0; !failed && i < record.sourceTypes.size(); ++i) {
-        const auto &t = record.sourceTypes.at(i);
-        run(s.sourceType, Statements::insert(s.sourceType, id, {i, t.type, t.count}));
-    }
-    for (int i = 0; !failed && i < record.others.size(); ++i) {
+    for (int i = 0; i < record.sourceTypes.size(); ++i)
+        s.sourceType.add({i, record.sourceTypes.at(i).type, record.sourceTypes.at(i).count});
+    for (int i = 0; i < record.others.size(); ++i) {
         const auto &o = record.others.at(i);
-        run(s.other, Statements::insert(s.other, id, {i, o.tag, o.name, o.path, o.value}));
+        s.other.add({i, o.tag, o.name, o.path, o.value});
+    }
+    for (RowWriter *writer : s.writers()) {
+        if (ok)
+            ok = writer->write(id, error);
+        else
+            writer->clear();
     }
 
-    if (!failed && db.commit())
-        return Outcome::Stored;
-    *error = errorText(failed ? failed->lastError() : db.lastError());
-    db.rollback();
+    if (m_inBatch) {
+        if (ok && exec("RELEASE SAVEPOINT page"))
+            return Outcome::Stored;
+        if (!exec("ROLLBACK TO SAVEPOINT page") || !exec("RELEASE SAVEPOINT page")) {
+            db.rollback();
+            m_batchLost = true;
+        }
+    } else {
+        if (ok && db.commit())
+            return Outcome::Stored;
+        if (ok)
+            *error = errorText(db.lastError());
+        db.rollback();
+    }
     // A unique digest that is there now was stored by someone else first.
     QString ignored;
     return contains(sha256, &ignored) ? Outcome::AlreadyPresent : Outcome::Failed;

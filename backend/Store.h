@@ -10,8 +10,12 @@
 
 // The database of received pages (schema.sql, docs/backend.md), on SQLite or
 // PostgreSQL through QtSql. Each Store has a connection of its own, so every
-// thread that stores pages makes its own Store. A page is stored in one
-// transaction: whole or not at all.
+// thread that stores pages makes its own Store.
+//
+// A page is stored whole or not at all: in a transaction of its own, or,
+// inside a batch, under a savepoint of its own that is rolled back when any
+// of its rows fails. A batch saves the commit per page (most of the cost of a
+// small page); a batch that fails to commit stores none of its pages.
 class CrvB_Store
 {
 public:
@@ -41,6 +45,13 @@ public:
     // when asking failed (then `error` is set).
     bool contains(const QByteArray &sha256, QString *error);
 
+    // Opens a batch: the pages stored until commitBatch() share one
+    // transaction. False with `error` when it cannot be opened.
+    bool beginBatch(QString *error);
+    bool inBatch() const { return m_inBatch; }
+    // Commits the batch; false with `error` when it was rolled back instead.
+    bool commitBatch(QString *error);
+
     // Stores one page's record. AlreadyPresent when a page with the same
     // digest was stored first (also by another process at the same time).
     Outcome store(const QByteArray &sha256, qint64 pageBytes, const CrvB_ReportRecord &record,
@@ -51,9 +62,12 @@ public:
 
 private:
     bool createSchema(QString *error);
+    bool exec(const char *sql);
     class Statements;
 
     QString m_connection;
     CrvB_DatabaseUrl m_url;
     std::unique_ptr<Statements> m_statements;
+    bool m_inBatch = false;
+    bool m_batchLost = false; // rolled back: the rest of the batch fails too
 };

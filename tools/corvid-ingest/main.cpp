@@ -14,7 +14,8 @@
 namespace {
 
 const char usage[] =
-    "Usage: corvid-ingest [--db URL] [--rejected DIR] [--shard K/N] PATH...\n"
+    "Usage: corvid-ingest [--db URL] [--rejected DIR] [--shard K/N] [--commit-every N]\n"
+    "                     PATH...\n"
     "       corvid-ingest --print PAGE\n"
     "\n"
     "Reads usage pages (device_usage_statistics.html as senders upload them) into\n"
@@ -29,10 +30,13 @@ const char usage[] =
     "                  (default: rejected/ beside an SQLite file; none for PostgreSQL).\n"
     "  --shard K/N     Take only the uploads whose folder number modulo N is K, so\n"
     "                  that N processes can share one folder (0 <= K < N).\n"
+    "  --commit-every N  Pages per transaction (default 200; 1 commits each page\n"
+    "                  on its own). Either way a page is stored whole or not at all.\n"
     "  --print PAGE    Print the page's values as JSON and store nothing.\n"
     "  -h, --help      Show this text.\n"
     "\n"
-    "Each page is stored in one transaction, whole or not at all; a page whose bytes\n"
+    "Each page is stored whole or not at all (under a savepoint of its own when\n"
+    "several share a transaction); a page whose bytes\n"
     "were stored before (SHA-256) is already present. A page that cannot be read\n"
     "exactly (not UTF-8, too large, too deep, too many values, mark-up cut off or\n"
     "out of place, no values) is rejected with its reason and leaves no rows.\n"
@@ -69,7 +73,7 @@ int main(int argc, char **argv)
     QCoreApplication app(argc, argv);
     QString url = QLatin1String(CrvB_DatabaseUrl::DefaultUrl), rejected, print;
     bool haveRejected = false;
-    int shardIndex = 0, shardCount = 1;
+    int shardIndex = 0, shardCount = 1, commitEvery = 200;
     QStringList paths;
     const QStringList args = app.arguments();
     for (int i = 1; i < args.size(); ++i) {
@@ -79,7 +83,8 @@ int main(int argc, char **argv)
             return 0;
         }
         const bool takesValue = arg == QLatin1String("--db") || arg == QLatin1String("--rejected")
-            || arg == QLatin1String("--shard") || arg == QLatin1String("--print");
+            || arg == QLatin1String("--shard") || arg == QLatin1String("--print")
+            || arg == QLatin1String("--commit-every");
         if (takesValue && i + 1 >= args.size())
             return fail(QStringLiteral("%1 needs a value (see --help)").arg(arg));
         if (arg == QLatin1String("--db")) {
@@ -89,6 +94,11 @@ int main(int argc, char **argv)
             haveRejected = true;
         } else if (arg == QLatin1String("--print")) {
             print = args.at(++i);
+        } else if (arg == QLatin1String("--commit-every")) {
+            bool ok = false;
+            commitEvery = args.at(++i).toInt(&ok);
+            if (!ok || commitEvery < 1)
+                return fail(QStringLiteral("--commit-every needs a positive number"));
         } else if (arg == QLatin1String("--shard")) {
             const QStringList parts = args.at(++i).split(QLatin1Char('/'));
             bool okIndex = false, okCount = false;
@@ -119,8 +129,10 @@ int main(int argc, char **argv)
     });
     ingest.setRejectedFolder(haveRejected ? rejected : CrvB_Ingest::defaultRejectedFolder(store.url()));
     ingest.setShard(shardIndex, shardCount);
+    ingest.setCommitEvery(commitEvery);
     for (const QString &path : paths)
         ingest.ingestPath(path);
+    ingest.finish();
     std::printf("%s\n", qUtf8Printable(ingest.summary()));
     return ingest.counts().failed ? 1 : 0;
 }
