@@ -71,6 +71,14 @@ bool PostgresServer::start()
             return false;
         }
     }
+    // Stops the server and removes the folder should this process end without
+    // the destructor.
+    const QString stop = (asRoot() ? QStringLiteral("runuser -u postgres -- ") : QString()) + QLatin1String(BinDir)
+        + QLatin1String("/pg_ctl -D ") + m_dir + QLatin1String("/data -m immediate stop");
+    const QString watchdog = QStringLiteral("exec </dev/null >/dev/null 2>&1; "
+                                            "while kill -0 %1 2>/dev/null; do sleep 1; done; %2; rm -rf %3")
+                                 .arg(QString::number(QCoreApplication::applicationPid()), stop, m_dir);
+    QProcess::startDetached(QStringLiteral("sh"), {"-c", watchdog});
     if (!run(QStringLiteral("initdb"), {"-D", m_dir + "/data", "-A", "trust", "-U", "postgres", "--no-locale",
                                         "-E", "UTF8", "--no-sync"}))
         return false;
@@ -86,13 +94,6 @@ bool PostgresServer::start()
     if (!run(QStringLiteral("pg_ctl"), {"-D", m_dir + "/data", "-l", m_dir + "/server.log", "-w", "start"}))
         return false;
     m_started = true;
-    // Stops the server should this process end without the destructor.
-    const QString stop = (asRoot() ? QStringLiteral("runuser -u postgres -- ") : QString()) + QLatin1String(BinDir)
-        + QLatin1String("/pg_ctl -D ") + m_dir + QLatin1String("/data -m immediate stop");
-    QProcess::startDetached(QStringLiteral("sh"),
-                            {"-c", QStringLiteral("exec </dev/null >/dev/null 2>&1; while kill -0 %1 2>/dev/null; do sleep 1; done; %2; "
-                                                  "rm -rf %3")
-                                       .arg(QString::number(QCoreApplication::applicationPid()), stop, m_dir)});
     return true;
 }
 
