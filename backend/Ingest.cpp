@@ -141,7 +141,12 @@ void CrvB_Ingest::ingestPage(const QString &pagePath, const CrvB_Store::Arrival 
         reject(pagePath, QByteArray(), QStringLiteral("larger than %1 bytes").arg(CrvB_PageReader::MaxPageBytes));
         return;
     }
-    const QByteArray page = file.read(CrvB_PageReader::MaxPageBytes + 1);
+    // Read no more than the limit even should the file grow meanwhile.
+    const QByteArray page = file.read(qMin(file.size(), CrvB_PageReader::MaxPageBytes) + 1);
+    if (page.size() > CrvB_PageReader::MaxPageBytes) {
+        reject(pagePath, QByteArray(), QStringLiteral("larger than %1 bytes").arg(CrvB_PageReader::MaxPageBytes));
+        return;
+    }
     file.close();
     const QByteArray sha256 = sha256Hex(page);
     QString error;
@@ -188,7 +193,7 @@ void CrvB_Ingest::store(const QString &pagePath, const QByteArray &sha256, qint6
     switch (m_store.store(sha256, bytes, record, arrival, &error)) {
     case CrvB_Store::Outcome::Stored:
         ++m_counts.ingested;
-        if (m_store.inBatch() && (++m_batchPages >= m_commitEvery || m_batchAge.elapsed() >= 250))
+        if (m_store.inBatch() && (++m_batchPages >= m_commitEvery || m_batchAge.elapsed() >= 1000))
             finish();
         break;
     case CrvB_Store::Outcome::AlreadyPresent:

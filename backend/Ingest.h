@@ -32,8 +32,8 @@ public:
     // Where rejected pages are copied; empty (the default) copies nothing.
     void setRejectedFolder(const QString &folder);
     // Pages stored per transaction (default 200; 1 gives each page a
-    // transaction of its own). A batch is also committed after a quarter
-    // second, so a slow stream of pages does not wait in it.
+    // transaction of its own). A batch is also committed after a second,
+    // so that a slow stream of pages does not wait in it.
     void setCommitEvery(int pages);
     // Only the uploads whose folder number (or, for other pages, a digest of
     // the file name) modulo `count` is `index`: so that `count` workers can

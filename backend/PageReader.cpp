@@ -103,6 +103,8 @@ public:
 
     CrvB_PageReader::Result run()
     {
+        // A value takes some 60 bytes of a page the builder wrote.
+        m_result.values.reserve(qMin<qsizetype>(m_size / 64, m_limits.maxValues) + 16);
         qsizetype pos = 0;
         while (pos < m_size && m_result.ok()) {
             const char *lt = static_cast<const char *>(std::memchr(m_data + pos, '<', size_t(m_size - pos)));

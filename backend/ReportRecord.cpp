@@ -1,7 +1,6 @@
 #include "ReportRecord.h"
 
 #include <QHash>
-#include <QRegularExpression>
 #include <QSet>
 
 namespace {
@@ -64,13 +63,17 @@ QString section(const Value &value)
     return QString();
 }
 
+// The distinct words of a command line that start with "-" or "--" and a
+// letter, in order.
 QStringList optionsOf(const QString &line)
 {
-    static const QRegularExpression option(QStringLiteral("^--?[A-Za-z]"));
     QStringList options;
-    for (const QString &word : line.split(QLatin1Char(' '), Qt::SkipEmptyParts))
-        if (option.match(word).hasMatch() && !options.contains(word))
-            options.append(word);
+    for (const QStringView word : QStringView(line).split(QLatin1Char(' '), Qt::SkipEmptyParts)) {
+        const qsizetype dashes = word.startsWith(QLatin1String("--")) ? 2 : word.startsWith(QLatin1Char('-')) ? 1 : 0;
+        if (dashes && word.size() > dashes && word.at(dashes).isLetter() && word.at(dashes).unicode() < 128
+            && !options.contains(word))
+            options.append(word.toString());
+    }
     return options;
 }
 

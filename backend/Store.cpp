@@ -71,8 +71,9 @@ private:
     // QString as NULL, and a page's empty values are texts.
     static QVariant bindable(const QVariant &value)
     {
-        return value.typeId() == QMetaType::QString && value.toString().isNull() ? QVariant(QLatin1String(""))
-                                                                                 : value;
+        return value.typeId() == QMetaType::QString && static_cast<const QString *>(value.constData())->isNull()
+            ? QVariant(QLatin1String(""))
+            : value;
     }
 
     QSqlQuery &statement(int rows)
@@ -210,7 +211,9 @@ bool CrvB_Store::open(const QString &url, bool readOnly, QString *error)
         QSqlQuery pragma(db);
         pragma.exec(QStringLiteral("PRAGMA journal_mode=WAL"));
         pragma.exec(QStringLiteral("PRAGMA synchronous=NORMAL"));
-        pragma.exec(QStringLiteral("PRAGMA foreign_keys=ON"));
+        // Each page's savepoint keeps what it changed in a statement
+        // journal: in memory, not in a temporary file.
+        pragma.exec(QStringLiteral("PRAGMA temp_store=MEMORY"));
     }
     if (!createSchema(error))
         return false;

@@ -4,11 +4,12 @@
 -- AS IDENTITY PRIMARY KEY" on PostgreSQL). Times are ISO 8601 texts in UTC.
 -- Statements are separated by semicolons at the end of a line.
 --
--- The rows of a page are written once and never changed, so the tables of
--- rows have no index of their own: each index would be one more page to
--- write per stored report. The numbers (group_no, item_no, ...) keep the
--- page's order within a report and tie items to groups, lines to options
--- and parameters to cores.
+-- The rows of a page are written once, in the same transaction as their
+-- report row, and never changed. So the tables of rows have no index and no
+-- foreign key of their own: an index is one more page to write per stored
+-- report, a foreign key one more lookup per row. report_id names the report;
+-- the numbers (group_no, item_no, ...) keep the page's order within a report
+-- and tie items to groups, lines to options and parameters to cores.
 
 CREATE TABLE IF NOT EXISTS corvid_schema (
     version INTEGER NOT NULL
@@ -42,14 +43,14 @@ CREATE TABLE IF NOT EXISTS report (
 -- Device usage, configuration and pin data: the groups of the usage tables
 -- and their items (name=value texts split at the first "=").
 CREATE TABLE IF NOT EXISTS usage_group (
-    report_id BIGINT NOT NULL REFERENCES report (id) ON DELETE CASCADE,
+    report_id BIGINT NOT NULL,
     group_no INTEGER NOT NULL,
     section TEXT NOT NULL,
     name TEXT NOT NULL
 );
 
 CREATE TABLE IF NOT EXISTS usage_item (
-    report_id BIGINT NOT NULL REFERENCES report (id) ON DELETE CASCADE,
+    report_id BIGINT NOT NULL,
     item_no INTEGER NOT NULL,
     group_no INTEGER NOT NULL,
     level INTEGER NOT NULL,
@@ -59,21 +60,21 @@ CREATE TABLE IF NOT EXISTS usage_item (
 
 -- Tool usage: the command line history and the options each line uses.
 CREATE TABLE IF NOT EXISTS command_line (
-    report_id BIGINT NOT NULL REFERENCES report (id) ON DELETE CASCADE,
+    report_id BIGINT NOT NULL,
     line_no INTEGER NOT NULL,
     tool TEXT NOT NULL,
     command_line TEXT NOT NULL
 );
 
 CREATE TABLE IF NOT EXISTS command_option (
-    report_id BIGINT NOT NULL REFERENCES report (id) ON DELETE CASCADE,
+    report_id BIGINT NOT NULL,
     line_no INTEGER NOT NULL,
     option_name TEXT NOT NULL
 );
 
 -- Software quality: run statistics per tool.
 CREATE TABLE IF NOT EXISTS run_statistic (
-    report_id BIGINT NOT NULL REFERENCES report (id) ON DELETE CASCADE,
+    report_id BIGINT NOT NULL,
     row_no INTEGER NOT NULL,
     tool TEXT NOT NULL,
     runs BIGINT,
@@ -87,7 +88,7 @@ CREATE TABLE IF NOT EXISTS run_statistic (
 
 -- Help statistics: search words with and without results, help files opened.
 CREATE TABLE IF NOT EXISTS help_entry (
-    report_id BIGINT NOT NULL REFERENCES report (id) ON DELETE CASCADE,
+    report_id BIGINT NOT NULL,
     entry_no INTEGER NOT NULL,
     list TEXT NOT NULL,
     term TEXT NOT NULL,
@@ -96,13 +97,13 @@ CREATE TABLE IF NOT EXISTS help_entry (
 
 -- Core statistics: one row per core instance and its parameters.
 CREATE TABLE IF NOT EXISTS core (
-    report_id BIGINT NOT NULL REFERENCES report (id) ON DELETE CASCADE,
+    report_id BIGINT NOT NULL,
     core_no INTEGER NOT NULL,
     core_type TEXT NOT NULL
 );
 
 CREATE TABLE IF NOT EXISTS core_parameter (
-    report_id BIGINT NOT NULL REFERENCES report (id) ON DELETE CASCADE,
+    report_id BIGINT NOT NULL,
     parameter_no INTEGER NOT NULL,
     core_no INTEGER NOT NULL,
     name TEXT NOT NULL,
@@ -111,7 +112,7 @@ CREATE TABLE IF NOT EXISTS core_parameter (
 
 -- Project statistics: design and process properties, source file types.
 CREATE TABLE IF NOT EXISTS project_property (
-    report_id BIGINT NOT NULL REFERENCES report (id) ON DELETE CASCADE,
+    report_id BIGINT NOT NULL,
     property_no INTEGER NOT NULL,
     kind TEXT NOT NULL,
     name TEXT NOT NULL,
@@ -119,7 +120,7 @@ CREATE TABLE IF NOT EXISTS project_property (
 );
 
 CREATE TABLE IF NOT EXISTS source_type (
-    report_id BIGINT NOT NULL REFERENCES report (id) ON DELETE CASCADE,
+    report_id BIGINT NOT NULL,
     type_no INTEGER NOT NULL,
     source_type TEXT NOT NULL,
     files BIGINT
@@ -128,7 +129,7 @@ CREATE TABLE IF NOT EXISTS source_type (
 -- Every other value, as the page gives it: the place-and-route and
 -- simulator pages, partitions, project age, properties of no column above.
 CREATE TABLE IF NOT EXISTS page_value (
-    report_id BIGINT NOT NULL REFERENCES report (id) ON DELETE CASCADE,
+    report_id BIGINT NOT NULL,
     value_no INTEGER NOT NULL,
     tag TEXT NOT NULL,
     name TEXT,
