@@ -18,6 +18,27 @@ QString errorText(const QSqlError &error)
     return error.text().trimmed();
 }
 
+// Named placeholders ":p0", ":p1", ...: QtSql binds a value by name several
+// times as fast as by position, which formats the position as a name first.
+const QString &placeholder(int index)
+{
+    static const QStringList names = [] {
+        QStringList list;
+        for (int i = 0; i < 1024; ++i)
+            list.append(QStringLiteral(":p%1").arg(i));
+        return list;
+    }();
+    return names.at(index);
+}
+
+QString placeholders(int from, int count)
+{
+    QStringList list;
+    for (int i = from; i < from + count; ++i)
+        list.append(placeholder(i));
+    return list.join(QLatin1Char(','));
+}
+
 QVariant textOrNull(const QString &text)
 {
     return text.isNull() ? QVariant() : QVariant(text);
@@ -49,8 +70,8 @@ public:
             for (; rows - done >= chunk; done += chunk) {
                 QSqlQuery &query = statement(chunk);
                 for (int i = 0; i < chunk * m_width; ++i)
-                    query.bindValue(i, i % m_width == 0 ? QVariant(reportId)
-                                                        : bindable(m_values.at(done * m_width + i)));
+                    query.bindValue(placeholder(i), i % m_width == 0 ? QVariant(reportId)
+                                                                     : bindable(m_values.at(done * m_width + i)));
                 if (!query.exec()) {
                     *error = errorText(query.lastError());
                     clear();
@@ -80,10 +101,11 @@ private:
     {
         std::unique_ptr<QSqlQuery> &query = m_statements[rows];
         if (!query) {
-            const QString row = QLatin1Char('(') + QStringList(m_width, QStringLiteral("?")).join(QLatin1Char(','))
-                + QLatin1Char(')');
+            QStringList values;
+            for (int row = 0; row < rows; ++row)
+                values.append(QLatin1Char('(') + placeholders(row * m_width, m_width) + QLatin1Char(')'));
             query.reset(new QSqlQuery(m_db));
-            query->prepare(m_head + QStringList(rows, row).join(QLatin1Char(',')));
+            query->prepare(m_head + values.join(QLatin1Char(',')));
         }
         return *query;
     }
@@ -126,7 +148,7 @@ public:
                     QStringLiteral("source"), QStringLiteral("ingested_at")};
         return report.prepare(QStringLiteral("INSERT INTO report (%1) VALUES (%2) RETURNING id")
                                   .arg(columns.join(QLatin1String(", ")),
-                                       QStringList(columns.size(), QStringLiteral("?")).join(QLatin1String(", "))))
+                                       placeholders(0, int(columns.size()))))
             && find.prepare(QStringLiteral("SELECT 1 FROM report WHERE sha256 = ?"));
     }
 
@@ -322,7 +344,7 @@ CrvB_Store::Outcome CrvB_Store::store(const QByteArray &sha256, qint64 pageBytes
     reportValues += {textOrNull(arrival.receivedAt), textOrNull(arrival.domain), textOrNull(arrival.regid),
                      textOrNull(arrival.source), QDateTime::currentDateTimeUtc().toString(Qt::ISODate)};
     for (int i = 0; i < reportValues.size(); ++i)
-        s.report.bindValue(i, reportValues.at(i));
+        s.report.bindValue(placeholder(i), reportValues.at(i));
     bool ok = s.report.exec() && s.report.next();
     const qlonglong id = ok ? s.report.value(0).toLongLong() : -1;
     if (!ok)
