@@ -7,8 +7,9 @@
 
 const QStringList &CrvB_ReceivedUpload::metadataFileNames()
 {
-    static const QStringList names = {QStringLiteral("upload.txt"), QStringLiteral("metadata.txt"),
-                                      QStringLiteral("fields.txt")};
+    // "@fields.txt" cannot be the name of an uploaded file (an upload's
+    // name never holds "@"); "fields.txt" is the name of earlier receivers.
+    static const QStringList names = {QStringLiteral("@fields.txt"), QStringLiteral("fields.txt")};
     return names;
 }
 
@@ -31,6 +32,7 @@ bool CrvB_ReceivedUpload::read(const QString &folder, QString *error)
         *error = QStringLiteral("no upload metadata in %1").arg(folder);
         return false;
     }
+    const QString metadataName = QFileInfo(metadata).fileName();
     QString storedAs;
     // A metadata file is a few hundred bytes; more is not ours.
     for (const QByteArray &line : file.read(64 * 1024).split('\n')) {
@@ -49,14 +51,13 @@ bool CrvB_ReceivedUpload::read(const QString &folder, QString *error)
             storedAs = value;
     }
 
-    const QString metadataName = QFileInfo(metadata).fileName();
     if (storedAs.isEmpty() || storedAs.contains(QLatin1Char('/')) || storedAs.startsWith(QLatin1Char('.'))
-        || metadataFileNames().contains(storedAs)) {
+        || storedAs == metadataName) {
         // No usable name: the one other regular file of the folder.
         const QFileInfoList files = QDir(folder).entryInfoList(QDir::Files | QDir::NoSymLinks, QDir::Name);
         storedAs.clear();
         for (const QFileInfo &info : files) {
-            if (metadataFileNames().contains(info.fileName()))
+            if (info.fileName() == metadataName)
                 continue;
             if (!storedAs.isEmpty()) {
                 storedAs.clear();

@@ -12,7 +12,7 @@ class CrvB_ReceivedUpload
 {
 public:
     // The names the metadata file has had, newest first: a folder holding
-    // one of them is an upload folder.
+    // one of them is an upload folder. The one place these names are kept.
     static const QStringList &metadataFileNames();
     // The metadata file in `folder`, or an empty text when it has none.
     static QString metadataFile(const QString &folder);

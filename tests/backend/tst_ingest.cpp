@@ -142,7 +142,7 @@ private Q_SLOTS:
                 runStaged("corvid-report", arguments + QStringList{projects.at(i) + "/ledctrl_usage.xml"}, m_work);
             QVERIFY2(report.exitCode == 0, qPrintable(report.output));
         }
-        QVERIFY(writeFile(m_work + "/pages/000007/fields.txt",
+        QVERIFY(writeFile(m_work + "/pages/000007/@fields.txt",
                           "received=2026-12-06T14:27:03Z\ndomain=ex%C3%A4mple.org\nregid=R-1\n"
                           "stored_as=device_usage_statistics.html\n"));
     }
