@@ -9,6 +9,8 @@
 #   4. orb opens the sample's usage file: the Corvid plug-in builds the page,
 #      counts down five seconds and uploads it through vancurl
 #   5. the page, the project's send counter and what the receiver stored
+#   6. the received page read into an SQLite database, and the reports per
+#      target family it holds
 #
 # Everything stays under build/demo: private HOME and XDG folders, so the
 # user's own settings are neither read nor changed; nothing leaves loopback.
@@ -135,3 +137,8 @@ if [ $found = 0 ]; then
     echo "demo: the receiver stored no report" >&2
     exit 1
 fi
+
+echo "== corvid-ingest: the received page into the back end's database ($DEMO/corvid.sqlite)"
+"$STAGE/bin/corvid-ingest" --db "sqlite:$DEMO/corvid.sqlite" "$DEMO/received"
+echo "== corvid-stats families"
+"$STAGE/bin/corvid-stats" --db "sqlite:$DEMO/corvid.sqlite" families

@@ -4,7 +4,8 @@
 set -e
 
 PACKAGES="cmake g++ make pkg-config
-qt6-base-dev qt6-5compat-dev libqt6sql6-sqlite libgl-dev
+qt6-base-dev qt6-5compat-dev libqt6sql6-sqlite libqt6sql6-psql libgl-dev
+postgresql-15
 libsqlite3-dev
 libcurl4-openssl-dev libcpp-httplib-dev libssl-dev openssl ca-certificates
 libpacparser-dev

@@ -6,6 +6,8 @@
 #include "UploadForm.h"
 #include "UploadStore.h"
 
+#include "backend/Ingest.h"
+
 #include <httplib.h>
 
 #include <pthread.h>
@@ -17,6 +19,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <mutex>
 #include <string>
 #include <thread>
 
@@ -29,7 +32,7 @@ const char redirectTopic[] = "corvidupload";
 const char usage[] =
     "Usage: corvid-receiver --listen ADDRESS --port PORT --data DIR --cert FILE --key FILE\n"
     "                       [--max-bytes N] [--threads N] [--timeout S] [--no-redirect]\n"
-    "                       [--moved URL]\n"
+    "                       [--moved URL] [--ingest URL]\n"
     "\n"
     "Serves, over HTTPS, the redirect page that names the upload address and the\n"
     "upload form that Corvid posts its usage reports to, and stores every accepted\n"
@@ -52,6 +55,9 @@ const char usage[] =
     "                    client's failure path).\n"
     "  --moved URL       POST /upload answers 307 with Location: URL and stores\n"
     "                    nothing (to try out a client's failure path).\n"
+    "  --ingest URL      After storing an upload, read it into the database URL\n"
+    "                    (see corvid-ingest --help); when that fails the upload stays\n"
+    "                    stored for a later corvid-ingest run.\n"
     "  -h, --help        Show this text.\n"
     "\n"
     "The first line on standard output is \"listening on https://ADDRESS:PORT\"; then\n"
@@ -100,8 +106,16 @@ void answer(httplib::Response &response, int status, const std::string &text)
 }
 
 // Reads, checks and stores one upload form.
-void receiveUpload(UploadStore &store, size_t maxBytes, const httplib::Request &request,
-                   httplib::Response &response, const httplib::ContentReader &reader)
+// Where stored uploads are read into the back end's database; empty: nowhere.
+struct IngestTarget
+{
+    std::string url;
+    std::string dataDir;
+};
+
+void receiveUpload(UploadStore &store, size_t maxBytes, const IngestTarget &ingest,
+                   const httplib::Request &request, httplib::Response &response,
+                   const httplib::ContentReader &reader)
 {
     if (!request.is_multipart_form_data())
         return answer(response, 400, "refused: not a multipart form\n");
@@ -119,6 +133,14 @@ void receiveUpload(UploadStore &store, size_t maxBytes, const httplib::Request &
     const unsigned number = form.store(request.remote_addr);
     if (!number)
         return answer(response, form.refusalStatus(), form.refusalText());
+    if (!ingest.url.empty()) {
+        // One ingest at a time: the workers would only wait for each other's
+        // transactions in the database.
+        static std::mutex ingesting;
+        const std::lock_guard<std::mutex> lock(ingesting);
+        std::printf("%s\n", CrvB_Ingest::receiverIngest(ingest.url, ingest.dataDir, number).c_str());
+        std::fflush(stdout);
+    }
     response.set_content("Thank you: report " + std::to_string(number) + " received.\n", "text/plain");
 }
 
@@ -138,7 +160,7 @@ long long numberArgument(const std::string &text, long long min, long long max)
 
 int main(int argc, char **argv)
 {
-    std::string address, dataDir, certFile, keyFile, movedTo;
+    std::string address, dataDir, certFile, keyFile, movedTo, ingestUrl;
     long long port = -1;
     ReceiverServer::Limits limits;
     bool redirect = true;
@@ -166,6 +188,8 @@ int main(int argc, char **argv)
             certFile = value;
         } else if (arg == "--key") {
             keyFile = value;
+        } else if (arg == "--ingest") {
+            ingestUrl = value;
         } else if (arg == "--max-bytes") {
             const long long bytes = numberArgument(value, 1, 1ll << 50);
             if (bytes < 0)
@@ -216,6 +240,7 @@ int main(int argc, char **argv)
         + std::to_string(boundPort);
 
     UploadStore store(dataDir);
+    const IngestTarget ingest{ingestUrl, dataDir};
     server.Get(redirectPath, [&](const httplib::Request &request, httplib::Response &response) {
         if (request.get_param_value("topic") != redirectTopic)
             return answer(response, 404, "unknown topic\n");
@@ -229,7 +254,7 @@ int main(int argc, char **argv)
     server.Post("/upload", [&](const httplib::Request &request, httplib::Response &response,
                                const httplib::ContentReader &reader) {
         if (movedTo.empty())
-            return receiveUpload(store, limits.maxBodyBytes, request, response, reader);
+            return receiveUpload(store, limits.maxBodyBytes, ingest, request, response, reader);
         response.set_redirect(movedTo, 307);
         response.set_content("moved\n", "text/plain");
     });
