@@ -40,6 +40,14 @@ QString Environment::installRoot() const
     return m_dir->path() + QLatin1String("/install");
 }
 
+QString Environment::write(const QString &relativePath, const QByteArray &contents) const
+{
+    const QString file = path(relativePath);
+    if (!writeFile(file, contents))
+        qFatal("cannot write %s", qPrintable(file));
+    return file;
+}
+
 bool Environment::writeDataFile(const QString &relativePath, const QByteArray &contents) const
 {
     return writeFile(installRoot() + QLatin1String("/data/") + relativePath, contents);

@@ -8,26 +8,13 @@
 
 #include <new>
 
-namespace {
-
-const QString EmptyDeviceTable = QStringLiteral(
-    "&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
-    "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=4><B>Device Usage Statistics</B></TD></TR>\n"
-    "<TR ALIGN=CENTER BGCOLOR='#FFFF99'><TD><B>Macro Statistics</B></TD><TD><B>Miscellaneous "
-    "Statistics</B></TD><TD><B>Net Statistics</B></TD><TD><B>Site Usage</B></TD></TR>"
-    "<TR VALIGN=TOP>\n"
-    "<TD>&nbsp;</TD>\n<TD>&nbsp;</TD><TD>&nbsp;</TD>\n<TD>&nbsp;</TD>\n</TR></TABLE>\n");
-
-} // namespace
-
 class tst_ReportBuilder : public QObject
 {
     Q_OBJECT
 
-private:
-    std::unique_ptr<CorvidTest::Environment> m_env;
+    CorvidTest::Environment m_env;
     std::unique_ptr<QTemporaryDir> m_dir;
-    QString m_oldCurrent;
+    const QString m_oldCurrent = QDir::currentPath();
     int m_asked = 0;     // times the design name was asked for
     QStringList m_busy;  // the cursor: "busy", "idle"
 
@@ -49,12 +36,6 @@ private:
     }
 
 private Q_SLOTS:
-    void initTestCase()
-    {
-        m_env.reset(new CorvidTest::Environment);
-        m_oldCurrent = QDir::currentPath();
-    }
-
     // Every test builds in an empty working directory of its own: without a
     // project the builder reads and writes there.
     void init()
@@ -131,17 +112,11 @@ private Q_SLOTS:
         builder.createReport(QStringLiteral("top"), QStringLiteral("top"), QStringLiteral("Xc6"));
         QCOMPARE(m_busy, QStringList({"busy", "idle"}));
 
-        const QString page = builder.pageText();
-        QVERIFY(page.contains(QLatin1String("</TR>\n</TABLE>\n") + EmptyDeviceTable));
-        QVERIFY(page.contains(QLatin1String("<dtag-property name=\"RandomID\">"
-                                            "5eed5eed5eed5eed5eed5eed5eed5eed</dtag-property>")));
-        QVERIFY(!page.contains(QLatin1String("Configuration Data")) && !page.contains(QLatin1String("Pin Data")));
-
         QVERIFY(builder.written());
         QVERIFY(!builder.pageCut());
         QCOMPARE(QDir::current().absoluteFilePath(builder.reportPath()),
                  m_dir->filePath(QStringLiteral("device_usage_statistics.html")));
-        QCOMPARE(CorvidTest::readFile(builder.reportPath()), page.toUtf8());
+        QCOMPARE(CorvidTest::readFile(builder.reportPath()), builder.pageText().toUtf8());
     }
 
     // A page larger than the review shows goes whole to the file; the

@@ -31,14 +31,12 @@ class tst_VersionSection : public QObject
 {
     Q_OBJECT
 
-private:
-    std::unique_ptr<CorvidTest::Environment> m_env;
+    CorvidTest::Environment m_env;
 
 private Q_SLOTS:
     void initTestCase()
     {
-        m_env.reset(new CorvidTest::Environment);
-        QVERIFY(m_env->writeDataFile(QStringLiteral("orb_version"),
+        QVERIFY(m_env.writeDataFile(QStringLiteral("orb_version"),
                                      "product=Orb Design Suite\nversion=14.7\n"
                                      "Registration_ID=ORB-EVAL-0000\nconfiguration.xc5=WebEdition\n"
                                      "configuration.xc6=Professional\n"));
@@ -76,9 +74,9 @@ private Q_SLOTS:
 
     void identifiers()
     {
-        m_env->clearSettings();
+        m_env.clearSettings();
         CrvC_ReportData first, second;
-        first.projectFile = second.projectFile = m_env->home() + QLatin1String("/gone.orb");
+        first.projectFile = second.projectFile = m_env.home() + QLatin1String("/gone.orb");
         second.projectIteration = QStringLiteral("12"); // a report's iteration is kept once shown
         const QString a = CrvC_VersionSection::versionSection(first, {});
         const QString b = CrvC_VersionSection::versionSection(second, {});

@@ -78,7 +78,6 @@ private Q_SLOTS:
 
         m_work = m_env->home() + QLatin1String("/work");
         QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/top_usage.xml"), "<usage/>"));
-        QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/broken.orb"), "<project"));
 
         m_projectFile = project + QLatin1String("/ledctrl.orb");
         QString error;
@@ -138,7 +137,6 @@ private Q_SLOTS:
         QTest::addColumn<QString>("expectedPage"); // a page that must exist afterwards
 
         const QString page = m_work + QLatin1String("/device_usage_statistics.html");
-        QTest::newRow("no usage file") << QStringList{} << 1 << "no usage file given" << QString();
         QTest::newRow("page beside the usage file")
             << QStringList{"top_usage.xml"} << 0 << page << page;
         QTest::newRow("--out into a missing folder")
@@ -148,10 +146,6 @@ private Q_SLOTS:
             << m_work + "/elsewhere.html" << m_work + "/elsewhere.html";
         QTest::newRow("missing project")
             << QStringList{"--project", "nothere.orb", "top_usage.xml"} << 1 << "nothere.orb" << QString();
-        QTest::newRow("malformed project")
-            << QStringList{"--project", "broken.orb", "top_usage.xml"} << 1 << "broken.orb" << QString();
-        QTest::newRow("option without value") << QStringList{"top_usage.xml", "--design"} << 1
-                                              << "--design needs" << QString();
     }
 
     void commandLine()
