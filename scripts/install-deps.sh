@@ -8,7 +8,7 @@ qt6-base-dev qt6-5compat-dev libqt6sql6-sqlite libgl-dev
 libsqlite3-dev
 libcurl4-openssl-dev libcpp-httplib-dev libssl-dev openssl
 libpacparser-dev
-clang libclang-rt-14-dev llvm"
+clang libclang-rt-14-dev llvm clang-format"
 
 missing=""
 for p in $PACKAGES; do
