@@ -11,8 +11,7 @@
 
 namespace CorvidTest {
 
-Environment::Environment()
-    : m_dir(new QTemporaryDir)
+Environment::Environment() : m_dir(new QTemporaryDir)
 {
     QStandardPaths::setTestModeEnabled(true);
     const QString root = m_dir->path();
@@ -92,7 +91,8 @@ QByteArray readFile(const QString &path)
 
 QString cellText(const QString &html)
 {
-    static const QRegularExpression cellEnd(QStringLiteral("</TD>"), QRegularExpression::CaseInsensitiveOption);
+    static const QRegularExpression cellEnd(QStringLiteral("</TD>"),
+                                            QRegularExpression::CaseInsensitiveOption);
     static const QRegularExpression tag(QStringLiteral("<[^>]*>"));
     static const QRegularExpression blanksAround(QStringLiteral(" ?\\| ?"));
     return QString(html)

@@ -24,8 +24,7 @@ void TestOrb::initTestCase()
     QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/notes.txt"), "x"));
     QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/top_usage.XML"), "<usage/>"));
     // Nothing here may be sent: collection is off for the whole installation.
-    QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"),
-                                 "collectusagestatistics=false\n"));
+    QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), "collectusagestatistics=false\n"));
 }
 
 void TestOrb::commandLine_data()

@@ -25,15 +25,15 @@ private Q_SLOTS:
         QTest::newRow("missing file") << QByteArray() << "no such project file";
         QTest::newRow("empty file") << QByteArray("") << "not a well-formed project file";
         QTest::newRow("unclosed element") << QByteArray("<project><sources>") << "line 1";
-        QTest::newRow("UTF-7")
-            << QByteArray("<?xml version='1.0' encoding='UTF-7'?><project name='+2D3d,-'/>")
-            << "its encoding \"UTF-7\" is not supported";
+        QTest::newRow("UTF-7") << QByteArray(
+            "<?xml version='1.0' encoding='UTF-7'?><project name='+2D3d,-'/>")
+                               << "its encoding \"UTF-7\" is not supported";
         QTest::newRow("internal DTD subset")
             << QByteArray("<!DOCTYPE project [<!ENTITY n 'x'>]><project name='&n;'/>")
             << "not a well-formed project file: DTD declarations";
         QTest::newRow("deep nesting, never closed") << deep << "not a well-formed";
-        QTest::newRow("deep nesting is passed over") << deep + QByteArray("</x>").repeated(depth) + "</project>"
-                                                     << QString();
+        QTest::newRow("deep nesting is passed over")
+            << deep + QByteArray("</x>").repeated(depth) + "</project>" << QString();
     }
 
     void read()
@@ -49,7 +49,8 @@ private Q_SLOTS:
         if (problem.isEmpty()) {
             QCOMPARE(document.sources.size(), 1);
         } else {
-            QVERIFY2(error.startsWith(file + QLatin1String(": ")) && error.contains(problem), qPrintable(error));
+            QVERIFY2(error.startsWith(file + QLatin1String(": ")) && error.contains(problem),
+                     qPrintable(error));
             QCOMPARE(document.name, QStringLiteral("unchanged"));
         }
     }

@@ -15,8 +15,8 @@ class tst_ReportBuilder : public QObject
     CorvidTest::Environment m_env;
     std::unique_ptr<QTemporaryDir> m_dir;
     const QString m_oldCurrent = QDir::currentPath();
-    int m_asked = 0;     // times the design name was asked for
-    QStringList m_busy;  // the cursor: "busy", "idle"
+    int m_asked = 0;    // times the design name was asked for
+    QStringList m_busy; // the cursor: "busy", "idle"
 
     // Fixed clock and identifiers; the design name prompt answers `answer`
     // with `typed`.
@@ -44,8 +44,7 @@ private Q_SLOTS:
         QVERIFY(QDir::setCurrent(m_dir->path()));
         m_asked = 0;
         m_busy.clear();
-        CrvC_Settings::setValue(CrvC_Settings::RandomID,
-                                QStringLiteral("fedcba9876543210fedcba9876543210"));
+        CrvC_Settings::setValue(CrvC_Settings::RandomID, QStringLiteral("fedcba9876543210fedcba9876543210"));
     }
 
     void cleanup() { QDir::setCurrent(m_oldCurrent); }
@@ -57,18 +56,22 @@ private Q_SLOTS:
     {
         QTest::addColumn<QString>("given");
         QTest::addColumn<QString>("used");
-        QTest::newRow("upper-case extension kept") << "top.ORB" << "top.ORB";
-        QTest::newRow("extension appended") << "top" << "top.orb";
-        QTest::newRow("only a final extension counts") << "top.orb.bak" << "top.orb.bak.orb";
-        QTest::newRow("no project file") << "" << ".orb";
+        QTest::newRow("upper-case extension kept") << "top.ORB"
+                                                   << "top.ORB";
+        QTest::newRow("extension appended") << "top"
+                                            << "top.orb";
+        QTest::newRow("only a final extension counts") << "top.orb.bak"
+                                                       << "top.orb.bak.orb";
+        QTest::newRow("no project file") << ""
+                                         << ".orb";
     }
 
     void projectFile()
     {
         QFETCH(QString, given);
         QFETCH(QString, used);
-        QVERIFY(CorvidTest::writeFile(used + QLatin1String(".runs"),
-                                      "synth 2025-03-03T09:12:40 41 completed\n"));
+        QVERIFY(
+            CorvidTest::writeFile(used + QLatin1String(".runs"), "synth 2025-03-03T09:12:40 41 completed\n"));
         CrvC_ReportBuilder builder(environment());
         builder.createReport(given, QStringLiteral("top"), QStringLiteral("Xc6"));
         QCOMPARE(builder.data().projectFile, used);
@@ -84,8 +87,8 @@ private Q_SLOTS:
         QTest::addColumn<int>("asked");
         QTest::addColumn<QString>("device"); // tells which map report was read
 
-        QTest::newRow("caller's name used with its blanks") << "  top  " << true << "other" << 0
-                                                            << "untrimmed";
+        QTest::newRow("caller's name used with its blanks")
+            << "  top  " << true << "other" << 0 << "untrimmed";
         QTest::newRow("typed name trimmed") << "" << true << "  top  " << 1 << "trimmed";
         QTest::newRow("cancelled: empty name") << "" << false << "top" << 1 << "nameless";
     }
@@ -127,9 +130,12 @@ private Q_SLOTS:
         const qsizetype items = CrvC_ReportBuilder::PageTextLimit / 40 + 1000;
         for (qsizetype i = 0; i < items; ++i) {
             if (i % 50 == 0)
-                xml += (i ? "</group>\n" : "") + QByteArray("<group name=\"G")
-                       + QByteArray::number(i) + "\">\n";
-            xml += "<item name=\"Sl\xc3\xaf" "ce\" value=\"" + QByteArray::number(i) + "\"/>\n";
+                xml +=
+                    (i ? "</group>\n" : "") + QByteArray("<group name=\"G") + QByteArray::number(i) + "\">\n";
+            xml +=
+                "<item name=\"Sl\xc3\xaf"
+                "ce\" value=\""
+                + QByteArray::number(i) + "\"/>\n";
         }
         xml += "</group></DeviceUsage></DeviceUsageReport>\n";
         QVERIFY(CorvidTest::writeFile(QStringLiteral("top_usage.xml"), xml));
@@ -169,7 +175,7 @@ private Q_SLOTS:
             QVERIFY(QFile::link(QStringLiteral("target.html"), builder.reportPath()));
         else
             builder.setReportPath(how == QLatin1String("missing") ? QStringLiteral("gone/page.html")
-                                                                   : QStringLiteral("target.html"));
+                                                                  : QStringLiteral("target.html"));
 
         builder.createReport(QStringLiteral("top"), QStringLiteral("top"), QString());
         QVERIFY(!builder.written());

