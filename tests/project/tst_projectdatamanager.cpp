@@ -139,10 +139,7 @@ void TestProjectDataManager::collect_data()
                        "<file path='src/top.vhd'/><file path='src/pwm.v'/>"
                        "<file path='src/debounce.vhdl' type='VHDL'/><file path='doc/notes.txt'/>")
         << QStringList{"Partitions count\t0", "VHDL\t2", "Verilog\t1"};
-    QTest::newRow("filters select the process properties") << projectFile(
-        "<property name='PROP_Synthesis_Tool' value='Synth' enabled='false'/>"
-        "<property name='PROP_Simulator' value='OSim'/>",
-        "", "",
+    const QByteArray filtered =
         "<processProperty name='B' value='b'><filter key='DEVICE' value='xc6a50'/></processProperty>"
         "<processProperty name='D' value='d'><filter key='SYNTH_TOOL_IS_ENABLED' "
         "value='TRUE'/></processProperty>"
@@ -151,11 +148,14 @@ void TestProjectDataManager::collect_data()
         "<processProperty name='F' value='f'><filter key='SYNTHESIS_TOOL' value='Other'/>"
         "<filter key='SYNTHESIS_TOOL' value='Synth'/><filter key='SPEED' value='-2'/></processProperty>"
         "<processProperty name='G' value='g'><filter key='SIMULATOR_TOOL' value='OSim'/>"
-        "<filter key='TLMT' value='HDL'/></processProperty>")
-                                                           << QStringList{"PROP_Synthesis_Tool\tSynth",
-                                                                          "PROP_Simulator\tOSim",
-                                                                          "Partitions count\t0", "E\te",
-                                                                          "F\tf"};
+        "<filter key='TLMT' value='HDL'/></processProperty>";
+    QTest::newRow("filters select the process properties")
+        << projectFile(
+               "<property name='PROP_Synthesis_Tool' value='Synth' enabled='false'/>"
+               "<property name='PROP_Simulator' value='OSim'/>",
+               "", "", filtered)
+        << QStringList{"PROP_Synthesis_Tool\tSynth", "PROP_Simulator\tOSim", "Partitions count\t0", "E\te",
+                       "F\tf"};
     QTest::newRow("entries without an instance or with an empty value")
         << projectFile("", "", "",
                        "<processProperty id='z.id' name='Z'/>"
