@@ -6,6 +6,8 @@
 #   make fuzz       build the fuzz harnesses in build-fuzz/ and fuzz each one
 #                   for FUZZ_SECONDS (make fuzz FUZZ_SECONDS=600 for a long run)
 #   make screenshots  render the dialogs to docs/screenshots
+#   make format       format every .cpp and .h of ours with clang-format (.clang-format)
+#   make format-check report what make format would change, failing if anything
 
 BUILD_DIR ?= build
 JOBS ?= $(shell nproc)
@@ -22,7 +24,12 @@ SANITIZER_ENV = ASAN_OPTIONS=detect_leaks=1 \
 	LSAN_OPTIONS=suppressions=$(CURDIR)/tests/lsan.supp:print_suppressions=0 \
 	UBSAN_OPTIONS=print_stacktrace=1:halt_on_error=1
 
-.PHONY: all deps configure build test sanitize fuzz demo screenshots clean
+# Our C++ sources (build folders are not among them).
+FORMAT_DIRS = $(wildcard app backend host plugin project report tests tools transmit ui)
+FORMAT_FILES = $(shell find $(FORMAT_DIRS) -type f \( -name '*.cpp' -o -name '*.h' \) | sort)
+CLANG_FORMAT ?= clang-format
+
+.PHONY: all deps configure build test sanitize fuzz demo screenshots format format-check clean
 
 all: build
 
@@ -37,6 +44,7 @@ build: configure
 
 test: build
 	cd $(BUILD_DIR) && QT_QPA_PLATFORM=offscreen ctest --output-on-failure -j $(JOBS)
+	@sh scripts/test-ratio.sh
 
 sanitize: deps
 	cmake -S . -B $(ASAN_DIR) $(CLANG_FLAGS) "-DCMAKE_CXX_FLAGS=$(SANITIZERS)"
@@ -53,6 +61,12 @@ demo: build
 
 screenshots: build
 	$(BUILD_DIR)/stage/bin/corvid-screenshots --out docs/screenshots
+
+format:
+	$(CLANG_FORMAT) -i $(FORMAT_FILES)
+
+format-check:
+	$(CLANG_FORMAT) --dry-run --Werror $(FORMAT_FILES)
 
 clean:
 	rm -rf $(BUILD_DIR) $(ASAN_DIR) $(FUZZ_DIR)

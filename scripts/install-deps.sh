@@ -9,7 +9,7 @@ postgresql-15
 libsqlite3-dev
 libcurl4-openssl-dev libcpp-httplib-dev libssl-dev openssl ca-certificates
 libpacparser-dev
-clang libclang-rt-14-dev llvm"
+clang libclang-rt-14-dev llvm clang-format"
 
 missing=""
 for p in $PACKAGES; do

@@ -11,8 +11,7 @@
 
 namespace CorvidTest {
 
-Environment::Environment()
-    : m_dir(new QTemporaryDir)
+Environment::Environment() : m_dir(new QTemporaryDir)
 {
     QStandardPaths::setTestModeEnabled(true);
     const QString root = m_dir->path();
@@ -38,6 +37,14 @@ QString Environment::home() const
 QString Environment::installRoot() const
 {
     return m_dir->path() + QLatin1String("/install");
+}
+
+QString Environment::write(const QString &relativePath, const QByteArray &contents) const
+{
+    const QString file = path(relativePath);
+    if (!writeFile(file, contents))
+        qFatal("cannot write %s", qPrintable(file));
+    return file;
 }
 
 bool Environment::writeDataFile(const QString &relativePath, const QByteArray &contents) const
@@ -84,7 +91,8 @@ QByteArray readFile(const QString &path)
 
 QString cellText(const QString &html)
 {
-    static const QRegularExpression cellEnd(QStringLiteral("</TD>"), QRegularExpression::CaseInsensitiveOption);
+    static const QRegularExpression cellEnd(QStringLiteral("</TD>"),
+                                            QRegularExpression::CaseInsensitiveOption);
     static const QRegularExpression tag(QStringLiteral("<[^>]*>"));
     static const QRegularExpression blanksAround(QStringLiteral(" ?\\| ?"));
     return QString(html)

@@ -16,12 +16,16 @@ namespace CorvidTest {
 class Environment
 {
 public:
-    // Call first thing in initTestCase().
+    // Make it first thing in the test object (a member) or in initTestCase().
     Environment();
     ~Environment();
 
     // The private home directory.
     QString home() const;
+    // home()/<relativePath>; write() also writes `contents` there, making
+    // folders as needed (a file that cannot be written ends the test program).
+    QString path(const QString &relativePath) const { return home() + QLatin1Char('/') + relativePath; }
+    QString write(const QString &relativePath, const QByteArray &contents) const;
     // A private installation root, searched first (VANTOR); data files of a
     // test go to installRoot() + "/data/...".
     QString installRoot() const;

@@ -23,10 +23,8 @@ void TestOrb::initTestCase()
     QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/top_usage.xml"), "<usage/>"));
     QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/notes.txt"), "x"));
     QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/top_usage.XML"), "<usage/>"));
-    QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/top_usage.xml.bak"), "<usage/>"));
     // Nothing here may be sent: collection is off for the whole installation.
-    QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"),
-                                 "collectusagestatistics=false\n"));
+    QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), "collectusagestatistics=false\n"));
 }
 
 void TestOrb::commandLine_data()
@@ -38,20 +36,16 @@ void TestOrb::commandLine_data()
     QTest::newRow("unclaimed file") << QStringList{"open", "notes.txt"} << 1
                                     << "no editor can open notes.txt";
     QTest::newRow("suffix case matters") << QStringList{"open", "top_usage.XML"} << 1 << "no editor can open";
-    QTest::newRow("backup copy") << QStringList{"open", "top_usage.xml.bak"} << 1 << "no editor can open";
     QTest::newRow("usage file reaches the plug-in; collection off: nothing built")
         << QStringList{"open", "top_usage.xml"} << 0
         << "Corvid: open " + m_work + "/top_usage.xml (design \"top\")\nCorvid: collection is switched off";
     // The open context names the design as "<project>|<design>".
     QTest::newRow("design from the open context")
         << QStringList{"open", "top_usage.xml", "--design", "blinker"} << 0 << "(design \"blinker\")";
-    QTest::newRow("context naming no design") << QStringList{"open", "top_usage.xml", "--design", ""} << 0 << "(design \"\")";
     QTest::newRow("empty parts of the context dropped")
         << QStringList{"open", "top_usage.xml", "--design", "|des"} << 0 << "(design \"des\")";
     QTest::newRow("folder that is gone")
         << QStringList{"open", m_work + "/gone/top_usage.xml"} << 0 << "Corvid: cannot enter the folder";
-    QTest::newRow("open without file") << QStringList{"open"} << 1 << "open needs a file name";
-    QTest::newRow("unknown option") << QStringList{"--bogus"} << 1 << "unknown argument: --bogus";
 }
 
 void TestOrb::commandLine()

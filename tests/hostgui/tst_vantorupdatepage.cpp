@@ -1,5 +1,5 @@
-// The host's "VantorUpdate" page, which keeps the proxy choice that the
-// transfers read, and the browser seam of the help manager.
+// The host's "VantorUpdate" page, which keeps the proxy choice that
+// Corvid's transfers read.
 
 #include "common/TestEnvironment.h"
 
@@ -58,8 +58,6 @@ private Q_SLOTS:
     void init() { m_env->clearSettings(); }
     void loadAndApply_data();
     void loadAndApply();
-    void browser_data();
-    void browser();
 
 private:
     std::unique_ptr<CorvidTest::Environment> m_env;
@@ -115,28 +113,6 @@ void TestVantorUpdatePage::loadAndApply()
         QCoreApplication::sendEvent(&page, &apply);
     }
     QTEST(stored(), "after");
-}
-
-void TestVantorUpdatePage::browser_data()
-{
-    QTest::addColumn<QString>("address");
-    QTest::addColumn<QString>("opened"); // empty: nothing launched
-    QTest::newRow("web address") << "https://www.vantor.example/corvid" << "https://www.vantor.example/corvid";
-    QTest::newRow("local page") << "/tmp/x/device_usage_statistics.html" << "file:///tmp/x/device_usage_statistics.html";
-    QTest::newRow("blank") << "  " << "";
-}
-
-void TestVantorUpdatePage::browser()
-{
-    QFETCH(QString, address);
-    QStringList launched;
-    HelpManager::setLauncher([&](const QUrl &url) {
-        launched << url.toString();
-        return true;
-    });
-    HelpManager::runWebBrowser(address);
-    HelpManager::setLauncher({});
-    QTEST(launched.join(QLatin1Char(' ')), "opened");
 }
 
 QTEST_MAIN(TestVantorUpdatePage)

@@ -1,28 +1,20 @@
 #include "common/TestEnvironment.h"
 
 #include "host/Factory.h"
-#include "host/project/RepositoryAccess.h"
 #include "project/ProjectRepositoryValues.h"
 
 #include <QElapsedTimer>
 #include <QProcess>
-#include <QSqlDatabase>
 #include <QtTest>
 
-// The project repository component (libPrjrep_Repository) as Corvid reaches
-// it: reads and writes, the file beside the project, a damaged file, and
-// several processes writing one repository.
+// The project repository component (libPrjrep_Repository) shared with other
+// processes: concurrent sends never lose a count, and a repository another
+// process keeps locked is neither taken for an empty one nor overwritten.
 class TestRepository : public QObject
 {
     Q_OBJECT
 private Q_SLOTS:
     void initTestCase();
-    void modes_data();
-    void modes();
-    void values();
-    void damagedRepository_data();
-    void damagedRepository();
-    void connectionsAreRemoved();
     void concurrentWritersLoseNothing();
     void lockedRepository_data();
     void lockedRepository();
@@ -59,113 +51,11 @@ QString TestRepository::newProject(const QString &name)
     return file;
 }
 
-void TestRepository::modes_data()
-{
-    QTest::addColumn<bool>("projectExists");
-    QTest::addColumn<bool>("prepared"); // "k" was stored before
-    QTest::addColumn<bool>("write");    // else read
-    QTest::addColumn<QString>("outcome"); // the value read afterwards; "-": the call failed
-    QTest::addColumn<bool>("repositoryExists");
-
-    QTest::newRow("writing creates the repository") << true << false << true << "w" << true;
-    QTest::newRow("reading creates nothing") << true << false << false << "-" << false;
-    QTest::newRow("reading a stored value") << true << true << false << "v" << true;
-    QTest::newRow("no repository without a project file") << false << false << true << "-" << false;
-}
-
-void TestRepository::modes()
-{
-    QFETCH(bool, projectExists);
-    QFETCH(bool, prepared);
-    QFETCH(bool, write);
-    QFETCH(bool, repositoryExists);
-
-    const QString project = newProject(QStringLiteral("modes"));
-    if (!projectExists)
-        QFile::remove(project);
-    if (prepared)
-        QVERIFY(RepositoryAccess::write(project, "S", "Sub", "k", "v"));
-    QString value;
-    const bool done = write ? RepositoryAccess::write(project, "S", "Sub", "k", "w")
-                            : RepositoryAccess::read(project, "S", "Sub", "k", &value);
-    if (done && write)
-        QVERIFY(RepositoryAccess::read(project, "S", "Sub", "k", &value));
-    QTEST(done ? value : QStringLiteral("-"), "outcome");
-    QCOMPARE(QFileInfo::exists(repositoryFile(project)), repositoryExists);
-}
-
-void TestRepository::values()
-{
-    const QString project = newProject(QStringLiteral("values"));
-    const QString tricky = QStringLiteral("Grüße \"quoted\" 'x'; DROP TABLE entries;");
-    const auto write = [&](const char *sub, const char *key, const QString &value) {
-        return RepositoryAccess::write(project, "Corvid", QLatin1String(sub), QLatin1String(key), value);
-    };
-    QVERIFY(write("DesignDataCollection", "text", tricky));
-    QVERIFY(write("DesignDataCollection", "empty", QString()));
-    QVERIFY(write("DesignDataCollection", "twice", "first"));
-    QVERIFY(write("DesignDataCollection", "twice", "second"));
-    QVERIFY(!write("DesignDataCollection", "", "no key"));
-    QVERIFY(write("Other", "twice", "elsewhere")); // values are kept per sub-section
-
-    const auto read = [&](const char *key) {
-        QString value = QStringLiteral("stale");
-        const bool found = RepositoryAccess::read(project, "Corvid", "DesignDataCollection",
-                                                  QLatin1String(key), &value);
-        return found ? value : QStringLiteral("<none: %1>").arg(value);
-    };
-    QCOMPARE(read("text"), tricky);
-    QCOMPARE(read("empty"), QString());
-    QCOMPARE(read("twice"), QStringLiteral("second"));
-    QCOMPARE(read("never"), QStringLiteral("<none: >"));
-}
-
-void TestRepository::damagedRepository_data()
-{
-    QTest::addColumn<QByteArray>("contents");
-    QTest::newRow("not a database") << QByteArray("this is not SQLite at all, just text\n").repeated(100);
-    QTest::newRow("truncated header") << QByteArray("SQLite format 3\0", 16);
-}
-
-void TestRepository::damagedRepository()
-{
-    QFETCH(QByteArray, contents);
-    const QString project = newProject(QStringLiteral("damaged"));
-    QVERIFY(CorvidTest::writeFile(repositoryFile(project), contents));
-
-    const ProjectRepositoryValues &values = ProjectRepositoryValues::instance();
-    values.setValue(project, QStringLiteral("k"), QStringLiteral("v"));
-    QCOMPARE(values.getValue(project, QStringLiteral("k")), QString());
-    QCOMPARE(values.projectAgeInDays(project), QString());
-    QString error;
-    QVERIFY(!RepositoryAccess::write(project, "S", "Sub", "k", "v", &error));
-    QVERIFY2(error.startsWith(project + QLatin1String(": repository S/Sub")), qPrintable(error));
-    // The damaged file is left for the user to look at, not replaced.
-    QCOMPARE(CorvidTest::readFile(repositoryFile(project)), contents);
-}
-
-void TestRepository::connectionsAreRemoved()
-{
-    const QString project = newProject(QStringLiteral("connections"));
-    const ProjectRepositoryValues &values = ProjectRepositoryValues::instance();
-    for (int i = 0; i < 3; ++i) {
-        values.setValue(project, QStringLiteral("k"), QString::number(i));
-        QCOMPARE(values.getValue(project, QStringLiteral("k")), QString::number(i));
-    }
-    QCOMPARE(QSqlDatabase::connectionNames(), QStringList());
-}
-
 void TestRepository::concurrentWritersLoseNothing()
 {
     const QString project = newProject(QStringLiteral("concurrent"));
     const int times = 40;
     std::vector<std::unique_ptr<QProcess>> writers;
-    for (const char *key : {"first", "second"}) {
-        writers.emplace_back(new QProcess);
-        writers.back()->start(QStringLiteral(REPOTOOL),
-                              {QStringLiteral("increment"), project, QLatin1String(key),
-                               QString::number(times)});
-    }
     // Two senders counting the same project's sends: every send counts.
     for (int i = 0; i < 2; ++i) {
         writers.emplace_back(new QProcess);
@@ -177,8 +67,6 @@ void TestRepository::concurrentWritersLoseNothing()
         QCOMPARE(writer->exitCode(), 0);
     }
     const ProjectRepositoryValues &values = ProjectRepositoryValues::instance();
-    QCOMPARE(values.getValue(project, QStringLiteral("first")), QString::number(times));
-    QCOMPARE(values.getValue(project, QStringLiteral("second")), QString::number(times));
     QCOMPARE(values.getValue(project, QLatin1String(ProjectRepositoryValues::SendIterationKey)),
              QString::number(1 + 2 * times));
 }

