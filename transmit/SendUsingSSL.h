@@ -5,6 +5,8 @@
 #include <QString>
 #include <QStringList>
 
+#include "transmit/SendRecorder.h"
+
 #include <memory>
 
 class QEventLoopLocker;
@@ -31,6 +33,10 @@ public:
     // Uses `proxy` ("host:port", empty for none) without any discovery.
     explicit CrvC_SendUsingSSL(const QString &proxy);
     ~CrvC_SendUsingSSL() override;
+
+    // Makes this send a further attempt of a history entry instead of a new
+    // entry (retries); call before SendFile.
+    void setTicket(CrvC_SendRecorder::Ticket ticket) { m_ticket = std::move(ticket); }
 
     // Starts the lookup for the report at the absolute path `file`.
     void SendFile(const QString &file);
@@ -74,4 +80,5 @@ private:
     QProcess *m_lookupProcess = nullptr;
     bool m_ended = false;
     std::shared_ptr<QEventLoopLocker> m_keepAlive;
+    CrvC_SendRecorder::Ticket m_ticket;
 };

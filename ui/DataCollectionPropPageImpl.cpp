@@ -1,4 +1,5 @@
 #include "DataCollectionPropPageImpl.h"
+#include "SendHistoryDialog.h"
 
 #include "host/gui/PropSheetEvent.h"
 #include "transmit/DataCollectionEmail.h"
@@ -13,6 +14,7 @@ CrvC_DataCollectionPropPageImpl::CrvC_DataCollectionPropPageImpl(QWidget *parent
     setupUi(this);
     connect(sslRadioButton, &QAbstractButton::toggled, this,
             &CrvC_DataCollectionPropPageImpl::OnSSLButtonStateChanged);
+    connect(sentReportsButton, &QAbstractButton::clicked, this, &CrvC_DataCollectionPropPageImpl::showSentReports);
 }
 
 CrvC_DataCollectionPropPageImpl::~CrvC_DataCollectionPropPageImpl() = default;
@@ -88,4 +90,10 @@ QStringList CrvC_DataCollectionPropPageImpl::emailToolNames()
 void CrvC_DataCollectionPropPageImpl::OnSSLButtonStateChanged(bool on)
 {
     selectEmailTool->setEnabled(!on);
+}
+
+void CrvC_DataCollectionPropPageImpl::showSentReports()
+{
+    CrvC_SendHistoryDialog dialog(this);
+    dialog.exec();
 }

@@ -39,6 +39,7 @@ const char usage[] =
     "  -F NAME=VALUE      A form field. A VALUE starting with \"@\" names a file whose\n"
     "                     content is sent as a file upload (its base name as the\n"
     "                     file name). May be given any number of times.\n"
+    "  --version          Show the versions of vancurl and of its libcurl.\n"
     "  -h, --help         Show this text.\n"
     "\n"
     "Options may come in any order; URL (http:// or https://) comes last.\n"
@@ -157,6 +158,10 @@ int main(int argc, char **argv)
         const bool last = i + 1 == argc;
         if (arg == "-h" || arg == "--help") {
             std::fputs(usage, stdout);
+            return Success;
+        }
+        if (arg == "--version") {
+            std::printf("vancurl 1.0 (libcurl %s)\n", curl_version_info(CURLVERSION_NOW)->version);
             return Success;
         }
         if (arg == "--proxy" || arg == "--cacert" || arg == "-F") {
