@@ -57,6 +57,12 @@ bool execute(QSqlQuery &query, const QString &sql, const QVariantList &values = 
     return query.exec();
 }
 
+// SQLite takes a null text for NULL.
+QString text(const QString &value)
+{
+    return value.isNull() ? QStringLiteral("") : value;
+}
+
 qint64 msecs(const QDateTime &time)
 {
     return time.toMSecsSinceEpoch();
@@ -234,17 +240,23 @@ bool CrvC_SendHistory::open(bool create)
         if (version == SchemaVersion && !tables.contains(QLatin1String(table)))
             damage = tr("the table %1 is missing").arg(QLatin1String(table));
     }
-    if (!damage.isEmpty() || version == SchemaVersion) {
+    if (!damage.isEmpty()) {
         setup.finish();
-        if (damage.isEmpty())
-            return true;
         close();
         m_damaged = true;
         return fail(tr("The send history %1 is damaged").arg(file), damage);
     }
-    // Pages removed by retention give their space back to the file system.
-    setup.exec(QStringLiteral("PRAGMA auto_vacuum = INCREMENTAL"));
+    // Pages removed by retention give their space back to the file system;
+    // set before anything else is written to a new file.
+    if (version == 0)
+        setup.exec(QStringLiteral("PRAGMA auto_vacuum = INCREMENTAL"));
+    // A commit is atomic without waiting for the disk: a crash loses at most
+    // the last changes, never leaves half of one.
+    setup.exec(QStringLiteral("PRAGMA journal_mode = WAL"));
+    setup.exec(QStringLiteral("PRAGMA synchronous = NORMAL"));
     setup.finish();
+    if (version == SchemaVersion)
+        return true;
     const bool created = run(true, [](QSqlQuery &query) {
         return query.exec(QStringLiteral("CREATE TABLE IF NOT EXISTS entries(id INTEGER PRIMARY KEY AUTOINCREMENT, "
                                          "time INTEGER NOT NULL, project TEXT NOT NULL, design TEXT NOT NULL, "
@@ -400,8 +412,8 @@ qint64 CrvC_SendHistory::addEntry(const Entry &entry, const QByteArray &page, qi
         if (!execute(query,
                      QStringLiteral("INSERT INTO entries(time, project, design, method, destination, domain, "
                                     "regid, bytes, sha256, stored) VALUES(?, ?, ?, ?, ?, ?, ?, ?, ?, ?)"),
-                     {now, entry.project, entry.design, methodName(entry.method), entry.destination,
-                      entry.domain, entry.regid, qint64(page.size()), QString::fromLatin1(sha),
+                     {now, text(entry.project), text(entry.design), methodName(entry.method),
+                      text(entry.destination), text(entry.domain), text(entry.regid), qint64(page.size()), QString::fromLatin1(sha),
                       qint64(stored.size())}))
             return false;
         id = query.lastInsertId().toLongLong();
@@ -448,7 +460,7 @@ bool CrvC_SendHistory::finishAttempt(qint64 attemptId, State state, const QStrin
         return execute(query,
                        QStringLiteral("UPDATE attempts SET ended = ?, state = ?, detail = ?, exit_status = ?, "
                                       "http_status = ? WHERE id = ?"),
-                       {msecs(QDateTime::currentDateTimeUtc()), stateName(state), detail, exitStatus, httpStatus,
+                       {msecs(QDateTime::currentDateTimeUtc()), stateName(state), text(detail), exitStatus, httpStatus,
                         attemptId})
                && (query.numRowsAffected() == 1 || fail(tr("The send history has no attempt %1").arg(attemptId), QString()));
     });
@@ -459,7 +471,7 @@ bool CrvC_SendHistory::setDestination(qint64 id, const QString &destination, con
 {
     return run(true, [&](QSqlQuery &query) {
         return execute(query, QStringLiteral("UPDATE entries SET destination = ?, domain = ?, regid = ? WHERE id = ?"),
-                       {destination, domain, regid, id})
+                       {text(destination), text(domain), text(regid), id})
                && (query.numRowsAffected() == 1 || fail(tr("The send history has no entry %1").arg(id), QString()));
     });
 }

@@ -33,15 +33,15 @@ public:
     enum class Method { Upload, Email };
     enum class State { Sending, Sent, Failed, Handed };
 
-    static const int MaxEntries = 100;
-    static const qint64 MaxBytes = 200 * 1024 * 1024;
+    static constexpr int MaxEntries = 100;
+    static constexpr qint64 MaxBytes = 200 * 1024 * 1024;
     // Automatic retries of a failed upload: at most this many, only while
     // the report is younger than RetryDays.
-    static const int MaxRetries = 3;
-    static const int RetryDays = 14;
+    static constexpr int MaxRetries = 3;
+    static constexpr int RetryDays = 14;
     // An attempt still marked as sending after this long was cut off (the
     // host ended during the transfer) and counts as failed.
-    static const int StaleSendingSecs = 3600;
+    static constexpr int StaleSendingSecs = 3600;
 
     struct Attempt
     {

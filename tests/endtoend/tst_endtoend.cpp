@@ -95,10 +95,8 @@ ToolRun TestEndToEnd::orb(bool withProject, const QStringList &extraEnvironment)
     if (withProject)
         arguments << QStringLiteral("--project") << m_projectFile;
     arguments << QStringLiteral("open") << m_project + QLatin1String("/ledctrl_usage.xml");
-    const QString config = QFileInfo(Gui::Clip::Settings::userFileName()).absolutePath().chopped(4);
     return runStaged(QStringLiteral("orb"), arguments, m_env->home(),
-                     QStringList{QStringLiteral("ORB_DEBUG=1"), QLatin1String("XDG_CONFIG_HOME=") + config}
-                         + extraEnvironment);
+                     QStringList{QStringLiteral("ORB_DEBUG=1")} + Environment::locations() + extraEnvironment);
 }
 
 void TestEndToEnd::orbOpen_data()
