@@ -57,8 +57,10 @@ CrvC_SendHistoryDialog::CrvC_SendHistoryDialog(QWidget *parent)
     m_message = new QLabel(this);
     m_message->setWordWrap(true);
     layout->addWidget(m_message);
-    auto *folder = new QLabel(tr("Kept in %1").arg(QDir::toNativeSeparators(CrvC_SendHistory::defaultDirectory())),
-                              this);
+    QString where = CrvC_SendHistory::defaultDirectory();
+    if (where.startsWith(QDir::homePath() + QLatin1Char('/')))
+        where.replace(0, QDir::homePath().size(), QStringLiteral("~"));
+    auto *folder = new QLabel(tr("Kept in %1").arg(QDir::toNativeSeparators(where)), this);
     folder->setTextInteractionFlags(Qt::TextSelectableByMouse);
     layout->addWidget(folder);
 
@@ -155,7 +157,7 @@ void CrvC_SendHistoryDialog::onSelectionChanged()
         m_page->clear();
         return;
     }
-    QString details = tr("Project: %1   Design: %2\nSent to %3, %4 bytes, SHA-256 %5")
+    QString details = tr("Project: %1   Design: %2\nDestination: %3, %4 bytes, SHA-256 %5")
                           .arg(entry->project, entry->design, entry->destination)
                           .arg(entry->bytes)
                           .arg(QString::fromLatin1(entry->sha256));
