@@ -5,6 +5,7 @@
 #include "ui/SendClipDlg.h"
 #include "ui/SendToClipDlg.h"
 
+#include "transmit/SendRecorder.h"
 #include "transmit/UserNotice.h"
 
 #include "host/FileSupervisor.h"
@@ -65,6 +66,11 @@ void removeHandlers()
 {
     CrvC_UserNotice::setHandlers({}, {});
     CrvC_CollectionCycle::setDialogs({});
+    // The history's last writes, and their answers waiting in the event
+    // queue, run while their code is still loaded.
+    CrvC_SendRecorder::waitForDone();
+    if (QCoreApplication::instance())
+        QCoreApplication::sendPostedEvents(QCoreApplication::instance(), QEvent::MetaCall);
 }
 
 } // namespace

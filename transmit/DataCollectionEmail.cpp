@@ -17,13 +17,13 @@ QStringList CrvC_DataCollectionEmail::emailTools()
     return m_impl->emailTools();
 }
 
-void CrvC_DataCollectionEmail::send(const QString &tool, const QString &to, const QString &subject,
+bool CrvC_DataCollectionEmail::send(const QString &tool, const QString &to, const QString &subject,
                                     const QString &body, const QString &file)
 {
     const QStringList words =
         commandWords(m_impl->toolCommand(tool), m_impl->composeArgument(tool, to, subject, body, file));
     if (words.size() < 2)
-        return;
+        return false;
 
     // The mail program runs detached: it may stay open after the host has
     // quit, and no process object is left behind for it. Nobody reads its
@@ -34,8 +34,10 @@ void CrvC_DataCollectionEmail::send(const QString &tool, const QString &to, cons
     process.setProgram(words.first());
     process.setArguments(words.mid(1));
     process.setStandardInputFile(QProcess::nullDevice());
-    if (!process.startDetached())
-        onProcessError(QProcess::FailedToStart);
+    if (process.startDetached())
+        return true;
+    onProcessError(QProcess::FailedToStart);
+    return false;
 }
 
 QStringList CrvC_DataCollectionEmail::commandWords(const QString &command, const QString &argument)

@@ -11,6 +11,7 @@
 #include <QBuffer>
 #include <QCoreApplication>
 #include <QEventLoopLocker>
+#include <QRegularExpression>
 #include <QTimer>
 #include <QUrl>
 
@@ -58,6 +59,13 @@ QByteArray forDebug(const QByteArray &text)
 const qint64 MaxLookupAnswer = 1024 * 1024;
 // Of the upload's answer only the start is kept, for the debug output.
 const int MaxUploadAnswer = 4096;
+
+// The HTTP status in vancurl's reason line, 0 when it names none.
+int httpStatusIn(const QByteArray &errors)
+{
+    static const QRegularExpression status(QStringLiteral("HTTP status (\\d+)"));
+    return status.match(QString::fromUtf8(errors)).captured(1).toInt();
+}
 
 std::shared_ptr<QEventLoopLocker> keepApplicationAlive()
 {
@@ -113,6 +121,8 @@ void CrvC_SendUsingSSL::SendFile(const QString &file)
         return;
     }
     m_reportFile = file;
+    if (!m_ticket)
+        m_ticket = CrvC_SendRecorder::begin(CrvC_SendHistory::Method::Upload, file, CrvC_MakerServer::baseUrl());
     m_keepAlive = keepApplicationAlive();
     const QStringList arguments = redirectArguments();
     for (const QString &argument : arguments)
@@ -144,7 +154,7 @@ void CrvC_SendUsingSSL::lookupFailedToStart()
     Port_MsgManData::debugStub("Corvid ERROR: cannot start %s: %s\n", ProgramName,
                                qUtf8Printable(m_lookupProcess->errorString()));
     Port_MsgManData::debugStub("Corvid ERROR: Redirected URL is empty.\n");
-    reportFailure(m_reportFile);
+    reportFailure(m_ticket, failureCause(true, NotStarted, QByteArray()), NotStarted, QByteArray());
     m_lookupProcess->deleteLater();
     deleteLater();
 }
@@ -155,21 +165,21 @@ void CrvC_SendUsingSSL::LaunchSSLProcess()
         return;
     m_ended = true;
     QString address;
-    if (m_lookupProcess->exitStatus() == QProcess::NormalExit && m_lookupProcess->exitCode() == 0) {
+    QByteArray errors;
+    const int status = exitStatusOf(m_lookupProcess);
+    if (status == 0) {
         m_lookupProcess->setReadChannel(QProcess::StandardOutput);
         address = uploadAddress(m_lookupProcess);
     } else {
         // An error page or a half-read answer names no address to trust.
-        Port_MsgManData::debugStub("Corvid ERROR: the address lookup failed (exit status %d): %s\n",
-                                   m_lookupProcess->exitStatus() == QProcess::NormalExit
-                                       ? m_lookupProcess->exitCode()
-                                       : -1,
-                                   forDebug(m_lookupProcess->readAllStandardError()).constData());
+        errors = forDebug(m_lookupProcess->readAllStandardError());
+        Port_MsgManData::debugStub("Corvid ERROR: the address lookup failed (exit status %d): %s\n", status,
+                                   errors.constData());
     }
 
     if (address.isEmpty()) {
         Port_MsgManData::debugStub("Corvid ERROR: Redirected URL is empty.\n");
-        reportFailure(m_reportFile);
+        reportFailure(m_ticket, failureCause(true, status, errors), status, errors);
     } else {
         Port_MsgManData::debugStub("Corvid: SSL process to %s has started.\n", qUtf8Printable(address));
         startUpload(address);
@@ -183,7 +193,18 @@ void CrvC_SendUsingSSL::startUpload(const QString &address)
     // The upload outlives this object: it owns itself and is released when it
     // ends, holding the application open until then.
     auto *upload = new QProcess;
-    const QString reportFile = m_reportFile;
+    const QStringList arguments = uploadArguments(address);
+    const auto field = [&arguments](const QString &name) {
+        const QString prefix = name + QLatin1Char('=');
+        for (const QString &argument : arguments) {
+            if (argument.startsWith(prefix))
+                return argument.mid(prefix.size());
+        }
+        return QString();
+    };
+    CrvC_SendRecorder::uploadStarted(m_ticket, address, field(QStringLiteral("domain")),
+                                     field(QStringLiteral("regid")));
+    const CrvC_SendRecorder::Ticket ticket = m_ticket;
     std::shared_ptr<QEventLoopLocker> keepAlive = m_keepAlive;
     auto answerStart = std::make_shared<QByteArray>();
     auto keepAnswerStart = [upload, answerStart] {
@@ -192,36 +213,76 @@ void CrvC_SendUsingSSL::startUpload(const QString &address)
             answerStart->append(chunk.left(MaxUploadAnswer - answerStart->size()));
     };
     connect(upload, &QProcess::readyReadStandardOutput, upload, keepAnswerStart);
-    connect(upload, &QProcess::finished, upload,
-            [upload, reportFile, keepAlive, answerStart, keepAnswerStart](int exitCode,
-                                                                          QProcess::ExitStatus exitStatus) {
-                keepAnswerStart();
-                const QByteArray answer = forDebug(*answerStart);
-                const QByteArray errors = forDebug(upload->readAllStandardError());
-                const int status = exitStatus == QProcess::NormalExit ? exitCode : -1;
-                Port_MsgManData::debugStub("Corvid: SSL upload ended with exit status %d: %s\n", status,
-                                           answer.constData());
-                if (status != 0) {
-                    Port_MsgManData::debugStub("Corvid ERROR: SSL upload failed: %s\n", errors.constData());
-                    reportFailure(reportFile);
-                }
-                upload->deleteLater();
-            });
-    connect(upload, &QProcess::errorOccurred, upload, [upload, reportFile, keepAlive](QProcess::ProcessError error) {
+    connect(upload, &QProcess::finished, upload, [upload, ticket, keepAlive, answerStart, keepAnswerStart] {
+        keepAnswerStart();
+        const QByteArray answer = forDebug(*answerStart);
+        const QByteArray errors = forDebug(upload->readAllStandardError());
+        const int status = exitStatusOf(upload);
+        Port_MsgManData::debugStub("Corvid: SSL upload ended with exit status %d: %s\n", status,
+                                   answer.constData());
+        if (status == 0) {
+            CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Sent, QString::fromUtf8(answer), 0);
+        } else {
+            Port_MsgManData::debugStub("Corvid ERROR: SSL upload failed: %s\n", errors.constData());
+            reportFailure(ticket, failureCause(false, status, errors), status, errors);
+        }
+        upload->deleteLater();
+    });
+    connect(upload, &QProcess::errorOccurred, upload, [upload, ticket, keepAlive](QProcess::ProcessError error) {
         if (error != QProcess::FailedToStart)
             return; // the finished signal follows
         Port_MsgManData::debugStub("Corvid ERROR: cannot start %s: %s\n", ProgramName,
                                    qUtf8Printable(upload->errorString()));
         upload->deleteLater();
-        QTimer::singleShot(0, [reportFile, keepAlive] { reportFailure(reportFile); });
+        QTimer::singleShot(0, [ticket, keepAlive] {
+            reportFailure(ticket, failureCause(false, NotStarted, QByteArray()), NotStarted, QByteArray());
+        });
     });
-    upload->start(QLatin1String(ProgramName), uploadArguments(address), QIODevice::ReadWrite);
+    upload->start(QLatin1String(ProgramName), arguments, QIODevice::ReadWrite);
 }
 
-void CrvC_SendUsingSSL::reportFailure(const QString &reportFile)
+int CrvC_SendUsingSSL::exitStatusOf(const QProcess *process)
 {
-    CrvC_UserNotice::warning(tr(FailureText));
-    CrvC_UserNotice::offerEmail(reportFile);
+    return process->exitStatus() == QProcess::NormalExit ? process->exitCode() : -1;
+}
+
+QString CrvC_SendUsingSSL::failureCause(bool lookup, int exitStatus, const QByteArray &errors)
+{
+    QString cause;
+    switch (exitStatus) {
+    case NotStarted:
+        return tr("vancurl could not be started");
+    case 0:
+        return tr("the server named no upload address");
+    case 3:
+        cause = tr("the report could not be read");
+        break;
+    case 4:
+        cause = tr("no connection to the server");
+        break;
+    case 5:
+        cause = tr("the server's certificate is not trusted");
+        break;
+    case 6:
+        cause = (lookup ? tr("the server answered HTTP status %1") : tr("the server refused the report (HTTP status %1)"))
+                    .arg(httpStatusIn(errors));
+        break;
+    default:
+        cause = exitStatus < 0 ? tr("vancurl ended abnormally") : tr("the transfer failed");
+        break;
+    }
+    return exitStatus < 0 ? cause : tr("%1 (vancurl exit status %2)").arg(cause).arg(exitStatus);
+}
+
+void CrvC_SendUsingSSL::reportFailure(const CrvC_SendRecorder::Ticket &ticket, const QString &cause, int exitStatus,
+                                      const QByteArray &errors)
+{
+    CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Failed, cause, qMax(-1, exitStatus),
+                              httpStatusIn(errors));
+    if (!ticket || ticket->interactive) {
+        CrvC_UserNotice::warning(tr(FailureText));
+        CrvC_UserNotice::offerEmail(ticket ? ticket->reportFile : QString());
+    }
 }
 
 QString CrvC_SendUsingSSL::uploadAddress(QIODevice *output)

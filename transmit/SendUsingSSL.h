@@ -15,9 +15,11 @@ class QIODevice;
 // Sends the report to the maker over HTTPS through the transfer tool vancurl:
 // a lookup of the current upload address at the maker's redirect service,
 // then the form upload. Create it with new, call SendFile once and forget it:
-// it deletes itself. A lookup or upload that fails warns the user and offers
-// the e-mail method (CrvC_UserNotice). The application is kept running
-// (QEventLoopLocker) until the upload has ended.
+// it deletes itself. Every send is recorded in the send history
+// (CrvC_SendRecorder) from before the lookup to its outcome. A lookup or
+// upload that fails warns the user and offers the e-mail method
+// (CrvC_UserNotice), except when it retried a recorded failure. The
+// application is kept running (QEventLoopLocker) until the upload has ended.
 class CrvC_SendUsingSSL : public QObject
 {
     Q_OBJECT
@@ -70,10 +72,20 @@ public Q_SLOTS:
     // failure, then schedules the object's deletion.
     void LaunchSSLProcess();
 
+    // The cause of a failed lookup or upload for the user, from vancurl's
+    // exit status (NotStarted: it could not be run) and its error output.
+    static QString failureCause(bool lookup, int exitStatus, const QByteArray &errors);
+
 private:
+    static constexpr int NotStarted = -2;
+
     void lookupFailedToStart();
     void startUpload(const QString &address);
-    static void reportFailure(const QString &reportFile);
+    static int exitStatusOf(const QProcess *process);
+    // Records the failure; a send the user started also gets the warning
+    // and the offer of the e-mail method.
+    static void reportFailure(const CrvC_SendRecorder::Ticket &ticket, const QString &cause, int exitStatus,
+                              const QByteArray &errors);
 
     QString m_proxy;
     QString m_reportFile;

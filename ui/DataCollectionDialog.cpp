@@ -6,6 +6,7 @@
 #include "host/String.h"
 #include "project/ProjectRepositoryValues.h"
 #include "transmit/MakerServer.h"
+#include "transmit/SendRecorder.h"
 
 #include <QApplication>
 #include <QFileInfo>
@@ -131,6 +132,7 @@ CrvC_ReportBuilder::Environment CrvC_DataCollectionDialog::builderEnvironment()
         bool ok = false;
         designName = QInputDialog::getText(this, tr("Corvid"), tr("Enter the design name:"),
                                            QLineEdit::Normal, QString(), &ok);
+        m_designName = designName.trimmed();
         return ok;
     };
     env.setBusy = [](bool busy) {
@@ -145,6 +147,7 @@ CrvC_ReportBuilder::Environment CrvC_DataCollectionDialog::builderEnvironment()
 void CrvC_DataCollectionDialog::createReport(const QString &projectFile, const QString &designName,
                                              const QString &targetFamily)
 {
+    m_designName = designName;
     m_builder.createReport(projectFile, designName, targetFamily);
     showContents();
 }
@@ -186,7 +189,9 @@ void CrvC_DataCollectionDialog::showContents()
 
 void CrvC_DataCollectionDialog::sendData()
 {
-    CrvC_SendToClipDlg::showSendMethodDialog(this, QFileInfo(reportPath()).absoluteFilePath());
+    const QString page = QFileInfo(reportPath()).absoluteFilePath();
+    CrvC_SendRecorder::noteOrigin(page, m_builder.data().projectFileToOpen(), m_designName);
+    CrvC_SendToClipDlg::showSendMethodDialog(this, page);
     ProjectRepositoryValues::instance().countSend(m_builder.data().projectFileToOpen(),
                                                   m_builder.projectIteration());
 }

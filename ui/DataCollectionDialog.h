@@ -80,6 +80,7 @@ private:
     CrvC_ReportBuilder::Environment builderEnvironment();
 
     CrvC_ReportBuilder m_builder;
+    QString m_designName; // of the last build, for the send history
     QTabWidget *m_tabWidget = nullptr;
     CrvC_DataCollectionHtmlViewer *m_introductionViewer = nullptr;
     CrvC_DataCollectionHtmlViewer *m_contentsViewer = nullptr;

@@ -3,7 +3,11 @@
 
 #include "common/TestEnvironment.h"
 
+#include "common/TestServer.h"
+#include "host/Settings.h"
+#include "project/CorvidSettings.h"
 #include "transmit/SendHistory.h"
+#include "transmit/SendRetry.h"
 
 #include <QRandomGenerator>
 #include <QSqlDatabase>
@@ -64,7 +68,11 @@ class TestSendHistory : public QObject
 
 private Q_SLOTS:
     void initTestCase() { m_env.reset(new Environment); }
-    void init() { QDir(CrvC_SendHistory::defaultDirectory()).removeRecursively(); }
+    void init()
+    {
+        m_env->clearSettings();
+        QDir(CrvC_SendHistory::defaultDirectory()).removeRecursively();
+    }
 
     void retention_data()
     {
@@ -146,6 +154,38 @@ private Q_SLOTS:
         // Claimed means under way: a second host finds nothing left.
         QVERIFY(history.claimPending(now, &claimed));
         QCOMPARE(claimed.size(), 0);
+    }
+
+    void retryNeedsCollection_data()
+    {
+        QTest::addColumn<bool>("collect");
+        QTest::newRow("collection on: retried") << true;
+        QTest::newRow("collection off: left alone") << false;
+    }
+
+    void retryNeedsCollection()
+    {
+        QFETCH(bool, collect);
+        CrvC_Settings::setValue(CrvC_Settings::CollectDeviceUsage, collect);
+        CrvC_Settings::setValue(CrvC_Settings::CorvidTimeStamp, QDateTime::currentDateTime().toString(Qt::ISODate));
+        Gui::Clip::Settings("WebUpdate", true, true, true).setValue("ProxyChoice", 0);
+        TestServer::putStageBinFirstInPath();
+        qputenv("CORVID_SERVER", "https://127.0.0.1:1"); // nobody listens
+        CrvC_SendHistory history;
+        const qint64 id = add(history, Method::Upload, QDateTime::currentDateTimeUtc(), 1, State::Failed);
+        CrvC_SendRetry::retryPending();
+        CrvC_SendHistory::Entry entry;
+        if (collect) {
+            QTRY_VERIFY_WITH_TIMEOUT(history.entry(id, &entry) && entry.attempts.size() == 2
+                                         && entry.attempts.last().state == State::Failed,
+                                     30000);
+            QVERIFY(entry.attempts.last().automatic);
+            QVERIFY(entry.outcome().startsWith("failed: no connection to the server"));
+        } else {
+            QTest::qWait(500);
+            QVERIFY(history.entry(id, &entry));
+            QCOMPARE(entry.attempts.size(), 1);
+        }
     }
 
     void commandLine_data()

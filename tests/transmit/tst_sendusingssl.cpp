@@ -7,6 +7,8 @@
 #include "host/Env.h"
 #include "host/MsgManData.h"
 #include "host/Settings.h"
+#include "host/StatusLine.h"
+#include "transmit/SendHistory.h"
 #include "transmit/SendUsingSSL.h"
 #include "transmit/UserNotice.h"
 
@@ -22,6 +24,7 @@ class TestSendUsingSSL : public QObject
     QStringList m_debug;
     QStringList m_warnings;
     QStringList m_offers;
+    QStringList m_status;
 
     // Sends `file` with PATH set to `path` while the lookup starts; waits
     // until the driver has deleted itself.
@@ -47,6 +50,7 @@ private Q_SLOTS:
         Port_MsgManData::setSink([this](const Port_MsgManData::Message &m) { m_debug << QString::fromStdString(m.text); });
         CrvC_UserNotice::setHandlers([this](const QString &text) { m_warnings << text; },
                                      [this](const QString &file) { m_offers << file; });
+        Port::StatusLine::setDisplay([this](const QString &text) { m_status << text; });
         TestServer::putStageBinFirstInPath();
     }
 
@@ -55,6 +59,9 @@ private Q_SLOTS:
         m_debug.clear();
         m_warnings.clear();
         m_offers.clear();
+        CrvC_SendRecorder::waitForDone(); // an earlier test's outcome is not this one's
+        QCoreApplication::processEvents();
+        m_status.clear();
         m_env->clearSettings();
         qunsetenv("CORVID_SERVER");
     }
@@ -163,11 +170,19 @@ private Q_SLOTS:
         QTest::addColumn<bool>("hideVancurl");
         QTest::addColumn<int>("reportSize");
         QTest::addColumn<bool>("delivered");
-        QTest::newRow("delivered") << QStringList() << false << false << 70000 << true;
-        QTest::newRow("page without an address") << QStringList{"--no-redirect"} << false << false << 100 << false;
-        QTest::newRow("receiver stopped") << QStringList() << true << false << 100 << false;
-        QTest::newRow("upload refused") << QStringList{"--max-bytes", "2000"} << false << false << 5000 << false;
-        QTest::newRow("vancurl not found") << QStringList() << false << true << 100 << false;
+        QTest::addColumn<QString>("status"); // the status line after the send
+        QTest::newRow("delivered") << QStringList() << false << false << 70000 << true
+                                   << "Usage report sent to 127.0.0.1, 68 KB \u2014 Edit > Preferences > Corvid > Sent reports";
+        QTest::newRow("page without an address") << QStringList{"--no-redirect"} << false << false << 100 << false
+                                                 << "Usage report not sent: the server named no upload address";
+        // Retried by corvid-history once the receiver is back.
+        QTest::newRow("receiver stopped") << QStringList() << true << false << 100 << false
+                                          << "Usage report not sent: no connection to the server (vancurl exit status 4)";
+        QTest::newRow("upload refused")
+            << QStringList{"--max-bytes", "2000"} << false << false << 5000 << false
+            << "Usage report not sent: the server refused the report (HTTP status 413) (vancurl exit status 6)";
+        QTest::newRow("vancurl not found") << QStringList() << false << true << 100 << false
+                                           << "Usage report not sent: vancurl could not be started";
     }
 
     void sends()
@@ -193,6 +208,18 @@ private Q_SLOTS:
         QFETCH(bool, hideVancurl);
         send(file, hideVancurl ? QFile::encodeName(server.scratchDir()) : qgetenv("PATH"));
 
+        // The send is recorded with its bytes, and said on the status line.
+        QTRY_COMPARE_WITH_TIMEOUT(m_status.size(), 1, 30000);
+        QTEST(m_status.first(), "status");
+        CrvC_SendHistory history;
+        QList<CrvC_SendHistory::Entry> entries;
+        QVERIFY2(history.entries(&entries), qPrintable(history.error()));
+        QByteArray stored;
+        QVERIFY(!entries.isEmpty() && history.page(entries.first().id, &stored));
+        QVERIFY(stored == report);
+        QCOMPARE(entries.first().state(), delivered ? CrvC_SendHistory::State::Sent : CrvC_SendHistory::State::Failed);
+        QCOMPARE(entries.first().pending(), !delivered);
+
         if (delivered) {
             QTRY_VERIFY_WITH_TIMEOUT(m_debug.join("").contains("SSL upload ended with exit status 0"), 30000);
             QVERIFY2(m_warnings.isEmpty() && m_offers.isEmpty(), qPrintable(m_debug.join("")));
@@ -203,12 +230,28 @@ private Q_SLOTS:
             QCOMPARE(upload.fields.value("domain"), CrvC_SendUsingSSL::domainName());
             QCOMPARE(upload.fields.value("regid"), QStringLiteral("Jürgen Ä, REG-9"));
             QCOMPARE(upload.fields.value("access"), QStringLiteral("v9orn"));
+            QCOMPARE(entries.first().regid, upload.fields.value("regid"));
         } else {
             QTRY_VERIFY_WITH_TIMEOUT(!m_offers.isEmpty(), 30000);
             QTest::qWait(200);
             QCOMPARE(m_warnings, QStringList{CrvC_SendUsingSSL::FailureText});
             QCOMPARE(m_offers, QStringList{file});
             QCOMPARE(server.uploadFolders().size(), 0);
+        }
+        if (stopReceiver) {
+            // Back, on another port: the retry asks today's server.
+            QVERIFY2(server.start(), qPrintable(server.error()));
+            Gui::Clip::Settings("WebUpdate", true, true, true).setValue("ProxyChoice", 0);
+            const ToolRun retry = runStaged("corvid-history", {"retry", QString::number(entries.first().id)},
+                                            m_env->home(),
+                                            Environment::locations() << "CORVID_SERVER=" + server.baseUrl());
+            QVERIFY2(retry.exitCode == 0 && retry.output.startsWith("Usage report sent to 127.0.0.1"),
+                     qPrintable(retry.output));
+            QCOMPARE(server.uploadFolders().size(), 1);
+            QVERIFY(server.upload(0).file == report);
+            QVERIFY(history.entries(&entries));
+            QCOMPARE(entries.first().attempts.size(), 2);
+            QCOMPARE(entries.first().outcome(), QStringLiteral("sent"));
         }
     }
 

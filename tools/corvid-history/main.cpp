@@ -142,7 +142,7 @@ int show(qint64 id)
 
 int retry(QCoreApplication &app, qint64 id)
 {
-    int status = 1;
+    int status = -1;
     CrvC_SendRetry::retry(id, [&app, &status](bool sent, const QString &message) {
         if (sent)
             std::printf("%s\n", qUtf8Printable(message));
@@ -151,7 +151,8 @@ int retry(QCoreApplication &app, qint64 id)
         status = sent ? 0 : 1;
         app.quit();
     });
-    app.exec();
+    if (status < 0) // not refused at once
+        app.exec();
     return status;
 }
 
