@@ -26,9 +26,9 @@ namespace {
 void installHandlers()
 {
     CrvC_UserNotice::setHandlers(
-        [](const QString &text) {
+        [](const QString &text, const QString &details) {
             Gui::Clip::MessageBox::warning(nullptr, QCoreApplication::translate("CrvC_CorvidPlugin", "Corvid"),
-                                           text, QMessageBox::Ok);
+                                           text, details, QMessageBox::Ok);
         },
         [](const QString &reportFile) {
             CrvC_SendToClipDlg::showSendMethodDialogForEmail(nullptr, reportFile);
@@ -39,17 +39,14 @@ void installHandlers()
                             const QString &targetFamily) {
         CrvC_DataCollectionDialog review(nullptr);
         review.createReport(projectFile, designName, targetFamily);
-        // Without a new page (no design name given, the page could not be
-        // written) an older page may still lie there; it is not this report.
-        if (!review.builder().written()) {
-            Port_MsgManData::debugStub("Corvid: no report written, nothing sent\n");
-            return;
-        }
+        // Sends nothing when no page was written (design-name prompt
+        // cancelled, page not writable).
         review.sendData();
     };
     dialogs.countDown = [](const QString &projectFile, const QString &designName,
                            const QString &targetFamily) {
         auto *countdown = new CrvC_SendClipDlg(nullptr, projectFile, designName, targetFamily);
+        // No page, no countdown: nothing is shown or sent.
         if (!countdown->reviewDialog()->builder().written()) {
             Port_MsgManData::debugStub("Corvid: no report written, nothing sent\n");
             delete countdown;

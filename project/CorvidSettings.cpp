@@ -31,7 +31,7 @@ void CrvC_Settings::setValue(const char *key, const QVariant &value)
     settings.setValue(QString::fromLatin1(key), value);
 }
 
-void CrvC_Settings::readInstallSettings(QString &timestamp, bool &collect)
+void CrvC_Settings::readInstallSettings(QString &timestamp, bool &collect, bool *collectFound)
 {
     QString path;
     for (const std::string &root : Port::VantorPath::GetInstance()) {
@@ -54,29 +54,50 @@ void CrvC_Settings::readInstallSettings(QString &timestamp, bool &collect)
         const QStringList parts = line.split(QLatin1Char('='));
         if (parts.size() < 2)
             continue;
-        if (parts.at(0) == QLatin1String("collectusagestatistics"))
+        if (parts.at(0) == QLatin1String("collectusagestatistics")) {
             collect = parts.at(1) == QLatin1String("true");
-        else if (parts.at(0) == QLatin1String("timestamp"))
+            if (collectFound)
+                *collectFound = true;
+        } else if (parts.at(0) == QLatin1String("timestamp"))
             timestamp = parts.at(1);
     }
 }
 
-bool CrvC_Settings::isCollectionEnabled()
+namespace {
+
+// The effective collection switch; `byInstallation` tells whether the
+// install-wide file's switch decided it.
+bool collectionDecision(bool &byInstallation)
 {
     bool installCollect = true;
+    bool installSetsCollect = false;
     QString installStamp;
-    readInstallSettings(installStamp, installCollect);
+    CrvC_Settings::readInstallSettings(installStamp, installCollect, &installSetsCollect);
 
-    const bool userCollect = collectDeviceUsage();
-    const QString userStamp = corvidTimeStamp();
+    const QString userStamp = CrvC_Settings::corvidTimeStamp();
+    bool installWins = userStamp.isEmpty();
+    if (!installWins && !installStamp.isEmpty()) {
+        const QDateTime install = QDateTime::fromString(installStamp, Qt::ISODate);
+        const QDateTime user = QDateTime::fromString(userStamp, Qt::ISODate);
+        installWins = !(install < user);
+    }
+    byInstallation = installWins && installSetsCollect;
+    return installWins ? installCollect : CrvC_Settings::collectDeviceUsage();
+}
 
-    if (userStamp.isEmpty())
-        return installCollect;
-    if (installStamp.isEmpty())
-        return userCollect;
-    const QDateTime install = QDateTime::fromString(installStamp, Qt::ISODate);
-    const QDateTime user = QDateTime::fromString(userStamp, Qt::ISODate);
-    return install < user ? userCollect : installCollect;
+} // namespace
+
+bool CrvC_Settings::isCollectionEnabled()
+{
+    bool byInstallation = false;
+    return collectionDecision(byInstallation);
+}
+
+bool CrvC_Settings::collectionSetByInstallation()
+{
+    bool byInstallation = false;
+    collectionDecision(byInstallation);
+    return byInstallation;
 }
 
 bool CrvC_Settings::collectDeviceUsage()

@@ -25,11 +25,16 @@ public:
     // A user who never applied the page follows the install-wide file, and
     // collection is on when neither says anything.
     static bool isCollectionEnabled();
+    // True when the install-wide file's switch is what isCollectionEnabled
+    // answers: the file sets it, and the user never applied the preference
+    // page or applied it before the file's timestamp.
+    static bool collectionSetByInstallation();
 
     // Reads the install-wide file (the first data/reports/corvidsettings in
     // the installation roots) into `timestamp` and `collect`; leaves both
     // unchanged when there is no readable file or the keys are absent.
-    static void readInstallSettings(QString &timestamp, bool &collect);
+    // `collectFound`, when given, tells whether the file set `collect`.
+    static void readInstallSettings(QString &timestamp, bool &collect, bool *collectFound = nullptr);
 
     static bool collectDeviceUsage();
     static QString corvidTimeStamp();

@@ -8,6 +8,7 @@ CrvC_PreferenceValues::Values CrvC_PreferenceValues::load()
 {
     Values values;
     values.collect = CrvC_Settings::isCollectionEnabled();
+    values.collectSetByInstallation = CrvC_Settings::collectionSetByInstallation();
     values.dontShowProgress = CrvC_Settings::dontShowSendProgressDlg();
     values.useSsl = CrvC_Settings::useSsl();
     values.emailTool = CrvC_Settings::selectedEmailTool();

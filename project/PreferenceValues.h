@@ -17,10 +17,12 @@ public:
         bool dontShowProgress = false;
         bool useSsl = true;
         QString emailTool;
+        bool collectSetByInstallation = false; // shown, never stored
     };
 
-    // The values the page opens with: isCollectionEnabled,
-    // "DontShowSendProgressDlg", "UseSSL" and "SelectedEmailTool".
+    // The values the page opens with: isCollectionEnabled (and whether the
+    // install-wide file decided it), "DontShowSendProgressDlg", "UseSSL" and
+    // "SelectedEmailTool".
     static Values load();
 
     // What apply stores: "CollectDeviceUsage", "CorvidTimeStamp" (`now`, ISO

@@ -1,4 +1,5 @@
 #include "CommandLog.h"
+#include "SectionBuffer.h"
 
 #include "host/InputFile.h"
 
@@ -97,12 +98,7 @@ private:
 };
 
 // `text` with "<" and ">" as "&lt;" and "&gt;" ("&" and quotes stay).
-qsizetype escapedSize(QStringView text)
-{
-    return text.size() + 3 * (text.count(QLatin1Char('<')) + text.count(QLatin1Char('>')));
-}
-
-void appendEscaped(QString &out, QStringView text)
+void appendEscaped(CrvC_SectionBuffer &out, QStringView text)
 {
     qsizetype from = 0;
     for (qsizetype i = 0; i < text.size(); ++i) {
@@ -110,7 +106,7 @@ void appendEscaped(QString &out, QStringView text)
         if (c != QLatin1Char('<') && c != QLatin1Char('>'))
             continue;
         out += text.mid(from, i - from);
-        out += c == QLatin1Char('<') ? QStringView(u"&lt;") : QStringView(u"&gt;");
+        out += QByteArrayView(c == QLatin1Char('<') ? "&lt;" : "&gt;");
         from = i + 1;
     }
     out += text.mid(from);
@@ -146,30 +142,16 @@ bool CrvC_CommandLog::checkFuseLog(const QString &path, CrvC_ReportData &data)
     return true;
 }
 
-QString CrvC_CommandLog::commandLineHistorySection(const CrvC_ReportData &data)
+void CrvC_CommandLog::commandLineHistorySection(const CrvC_ReportData &data, CrvC_SectionBuffer &out)
 {
-    const QStringView head(
-        u"&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
-        u"<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD><B>Tool Usage</B></TD></TR>\n"
-        u"<TR VALIGN=TOP><TD ALIGN=LEFT>Command Line History"
-        u"<dtag-section name=\"CommandLineLog\"><UL>\n");
-    const QStringView itemStart(u"<LI><dtag-cmdline>");
-    const QStringView itemEnd(u"</dtag-cmdline></LI>\n");
-    const QStringView tail(u"</dtag-section></UL></TD></TR>\n</TABLE>");
-
-    // The whole table is allocated once: a long history makes a text of many
-    // megabytes.
-    qsizetype size = head.size() + tail.size();
-    for (const QString &entry : data.commandHistory)
-        size += itemStart.size() + escapedSize(entry) + itemEnd.size();
-    QString text;
-    text.reserve(size);
-    text += head;
+    out += QByteArrayView("&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
+                          "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD><B>Tool Usage</B></TD></TR>\n"
+                          "<TR VALIGN=TOP><TD ALIGN=LEFT>Command Line History"
+                          "<dtag-section name=\"CommandLineLog\"><UL>\n");
     for (const QString &entry : data.commandHistory) {
-        text += itemStart;
-        appendEscaped(text, entry);
-        text += itemEnd;
+        out += QByteArrayView("<LI><dtag-cmdline>");
+        appendEscaped(out, entry);
+        out += QByteArrayView("</dtag-cmdline></LI>\n");
     }
-    text += tail;
-    return text;
+    out += QByteArrayView("</dtag-section></UL></TD></TR>\n</TABLE>");
 }

@@ -2,9 +2,13 @@
 
 #include <QtCore5Compat/QXmlDefaultHandler>
 
-#include <QList>
-#include <QPair>
+#include <initializer_list>
+
+#include "SectionBuffer.h"
+
+#include <QByteArray>
 #include <QString>
+#include <QStringView>
 
 // Lists the IP cores of the design from the netlist-build XML report
 // (<design>_lnkgen.drpt) as the core statistics section: one block per core
@@ -18,10 +22,6 @@
 class CrvC_CoresStatistics : public QXmlDefaultHandler
 {
 public:
-    // One (name, value) pair of a core instance, both already in dtag mark-up.
-    using Parameter = QPair<QString, QString>;
-    using CoreInstance = QList<Parameter>;
-
     CrvC_CoresStatistics();
     ~CrvC_CoresStatistics() override;
 
@@ -32,18 +32,27 @@ public:
                     const QString &qName) override;
     bool characters(const QString &ch) override;
 
-    // Parses the report at `path` and answers the section text: empty when
-    // the file is missing or holds no core instance, or is refused as too
-    // large or too deeply nested. A malformed file gives the instances read
-    // before the error.
-    QString sectionText(const QString &path);
+    // Parses the report at `path` and writes the section to `out`: nothing
+    // when the file is missing or holds no core instance, or is refused as
+    // too large or too deeply nested. A malformed file gives the instances
+    // read before the error.
+    void writeSection(const QString &path, CrvC_SectionBuffer &out);
+    // The same section in one piece.
+    QByteArray sectionText(const QString &path);
 
 private:
-    void parse();
-    QString sectionFromInstances() const;
+    void startInstance();
+    void endInstance();
+    // Adds a (name, value) pair to the instance being read: its first pair
+    // is the instance's title, the others stand four to a row.
+    void appendPair(QLatin1String nameTag, QStringView name, QLatin1String valueTag,
+                    QStringView value);
+    // Appends the attributes of `atts` as parameters, in attribute order,
+    // except those named in `skipped`.
+    void appendParameters(const QXmlAttributes &atts, std::initializer_list<QLatin1String> skipped);
 
-    QString m_fileName;
-    QList<CoreInstance> m_coreInstances;
-    // Index into m_coreInstances of the instance being filled; -1 for none.
-    qsizetype m_currentInstance = -1;
+    CrvC_SectionBuffer *m_text = nullptr;
+    bool m_inInstance = false;
+    // Pairs of the last instance so far; -1 before the first instance.
+    qsizetype m_pairs = -1;
 };

@@ -1,4 +1,5 @@
 #include "HelpViewerData.h"
+#include "SectionBuffer.h"
 #include "XmlDepthGuard.h"
 
 #include "host/String.h"
@@ -13,20 +14,22 @@ const QLatin1String OpenHelpFileTag("OpenHelpFile");
 
 // Appends one group of the table: its head, its entries two to a row, and
 // its end.
-void appendGroup(QString &text, const QList<CrvC_HelpViewerData::Entry> &entries,
-                 QLatin1String head, QLatin1String itemClose)
+void appendGroup(CrvC_SectionBuffer &text, const QList<CrvC_HelpViewerData::Entry> &entries,
+                 const char *head, const char *itemClose)
 {
     if (entries.isEmpty())
         return;
-    text += head;
+    text += QByteArrayView(head);
     for (qsizetype i = 0; i < entries.size(); ++i) {
         if (i > 0 && i % 2 == 0)
-            text += QLatin1String("\n</TR><TR>");
-        text += QLatin1String("<TD><dtag-search-item>") + entries.at(i).first + itemClose
-            + QString::number(entries.at(i).second)
-            + QLatin1String("</dtag-count-property> )</TD>\n");
+            text += QByteArrayView("\n</TR><TR>");
+        text += QByteArrayView("<TD><dtag-search-item>");
+        text += QStringView(entries.at(i).first);
+        text += QByteArrayView(itemClose);
+        text += QByteArrayView(QByteArray::number(entries.at(i).second));
+        text += QByteArrayView("</dtag-count-property> )</TD>\n");
     }
-    text += QLatin1String("</TR></dtag-group>");
+    text += QByteArrayView("</TR></dtag-group>");
 }
 
 } // namespace
@@ -98,29 +101,35 @@ bool CrvC_HelpViewerData::characters(const QString &ch)
 
 QString CrvC_HelpViewerData::sectionText() const
 {
+    CrvC_SectionBuffer text;
+    writeSection(text);
+    return QString::fromUtf8(text.takeAll());
+}
+
+void CrvC_HelpViewerData::writeSection(CrvC_SectionBuffer &text) const
+{
     if (m_searchFoundList.isEmpty() && m_searchNotFoundList.isEmpty()
         && m_openedHelpFiles.isEmpty())
-        return QString();
+        return;
 
-    QString text = QLatin1String("&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
-                                 "<dtag-section name=\"OrbHelpViewerData\">\n"
-                                 "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=2>"
-                                 "<B>Help Statistics</B></TD></TR>\n");
+    text += QByteArrayView("&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
+                           "<dtag-section name=\"OrbHelpViewerData\">\n"
+                           "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=2>"
+                           "<B>Help Statistics</B></TD></TR>\n");
     appendGroup(text, m_searchFoundList,
-                QLatin1String("<TR ALIGN=LEFT><TD COLSPAN=2><dtag-group><B>"
-                              "<dtag-group-name name=\"SearchFoundList\">\n"
-                              "Search words with results</dtag-group-name></B></TD></TR>\n<TR>"),
-                QLatin1String(" </dtag-search-item> ( <dtag-count-property>"));
+                "<TR ALIGN=LEFT><TD COLSPAN=2><dtag-group><B>"
+                "<dtag-group-name name=\"SearchFoundList\">\n"
+                "Search words with results</dtag-group-name></B></TD></TR>\n<TR>",
+                " </dtag-search-item> ( <dtag-count-property>");
     appendGroup(text, m_searchNotFoundList,
-                QLatin1String("<TR ALIGN=LEFT><TD COLSPAN=2><dtag-group><B>"
-                              "<dtag-group-name name=\"SearchNotFoundList\">\n"
-                              "Unsuccessful Search words</dtag-group-name></B></TD></TR>\n<TR>"),
-                QLatin1String("</dtag-search-item> ( <dtag-count-property>"));
+                "<TR ALIGN=LEFT><TD COLSPAN=2><dtag-group><B>"
+                "<dtag-group-name name=\"SearchNotFoundList\">\n"
+                "Unsuccessful Search words</dtag-group-name></B></TD></TR>\n<TR>",
+                "</dtag-search-item> ( <dtag-count-property>");
     appendGroup(text, m_openedHelpFiles,
-                QLatin1String("<TR VALIGN=TOP><TD COLSPAN=2><dtag-group><B>"
-                              "<dtag-group-name name=\"OpenedHelpFiles\">\n"
-                              "Help files</dtag-group-name></B></TD></TR>\n<TR>"),
-                QLatin1String("</dtag-search-item> ( <dtag-count-property>"));
-    text += QLatin1String("</dtag-section></TABLE>");
-    return text;
+                "<TR VALIGN=TOP><TD COLSPAN=2><dtag-group><B>"
+                "<dtag-group-name name=\"OpenedHelpFiles\">\n"
+                "Help files</dtag-group-name></B></TD></TR>\n<TR>",
+                "</dtag-search-item> ( <dtag-count-property>");
+    text += QByteArrayView("</dtag-section></TABLE>");
 }

@@ -6,6 +6,8 @@
 #include <QPair>
 #include <QString>
 
+class CrvC_SectionBuffer;
+
 // The help viewer's record of the user's searches (with and without results)
 // and opened help files, each with a count, as the help statistics section.
 // Reads the help viewer's usage file when constructed.
@@ -37,9 +39,11 @@ public:
                     const QString &qName) override;
     bool characters(const QString &ch) override;
 
-    // The section text: empty when nothing was read (missing file, no
-    // entries, or a file refused as too large or too deeply nested). A
-    // malformed file gives the entries read before the error.
+    // Writes the section to `out` as UTF-8: nothing when nothing was read
+    // (missing file, no entries, or a file refused as too large or too
+    // deeply nested). A malformed file gives the entries read before the error.
+    void writeSection(CrvC_SectionBuffer &out) const;
+    // The same section as one text.
     QString sectionText() const;
 
     // Where the help viewer's usage file is looked for; empty when no base

@@ -2,8 +2,10 @@
 #include "CommandLog.h"
 #include "CoresStatistics.h"
 #include "HelpViewerData.h"
+#include "PageStore.h"
 #include "ProjectStatistics.h"
 #include "RunStatistics.h"
+#include "SectionBuffer.h"
 #include "SynthesisReport.h"
 #include "UsageXml.h"
 #include "VersionSection.h"
@@ -28,6 +30,7 @@
 
 #include <atomic>
 #include <exception>
+#include <memory>
 #include <new>
 #include <system_error>
 #include <thread>
@@ -160,22 +163,25 @@ private:
 
 } // namespace
 
-// The page as it is assembled: every line goes to the file at once, as UTF-8
-// with "\n" between lines, and into the kept beginning until that is full.
+// The page as it is assembled: every line goes at once, as UTF-8 with "\n"
+// between lines, to each of its files (the page and the build's own copy),
+// and into the kept beginning until that is full.
 class CrvC_ReportBuilder::PageWriter
 {
 public:
-    PageWriter(const QString &path, QString &text, bool &cut)
-        : m_file(path)
-        , m_text(text)
+    PageWriter(const QStringList &paths, QString &text, bool &cut)
+        : m_text(text)
         , m_cut(cut)
     {
         m_text.clear();
         m_cut = false;
-        // QSaveFile would replace the link's target; the page goes only
-        // where the report path itself says.
-        if (!QFileInfo(path).isSymLink())
-            m_open = m_file.open(QIODevice::WriteOnly);
+        m_open = true;
+        for (const QString &path : paths) {
+            m_files.push_back(std::make_unique<QSaveFile>(path));
+            // QSaveFile would replace the link's target; the page goes only
+            // where the path itself says.
+            m_open = m_open && !QFileInfo(path).isSymLink() && m_files.back()->open(QIODevice::WriteOnly);
+        }
     }
 
     void operator()(const QString &line)
@@ -186,17 +192,29 @@ public:
     }
 
     // A line already encoded, as the readers hand back their large sections.
-    void utf8(const QByteArray &line)
+    void section(CrvC_SectionBuffer &text)
     {
         if (m_lines++ > 0)
             add(QStringLiteral("\n"));
-        write(line);
-        if (!m_cut)
-            keep(QString::fromUtf8(line));
+        // The first slice is a megabyte or the whole text, more than the
+        // kept beginning can take; three bytes hold at least one UTF-16 unit,
+        // so a character split at the cut lies past the room left.
+        if (!text.drain([this](const QByteArray &slice) {
+                write(slice);
+                if (!m_cut)
+                    keep(QString::fromUtf8(slice.constData(),
+                                           qMin(slice.size(), 3 * (PageTextLimit - m_text.size() + 1))));
+            }))
+            m_open = false; // a section lost on the way: the page is not written
     }
 
-    // True when the whole page is in place of the previous file.
-    bool commit() { return m_open && m_file.commit(); }
+    // True when every file is complete in place of its previous version.
+    bool commit()
+    {
+        for (const auto &file : m_files)
+            m_open = m_open && file->commit();
+        return m_open;
+    }
 
 private:
     void add(const QString &text)
@@ -216,8 +234,10 @@ private:
 
     void write(const QByteArray &bytes)
     {
-        if (m_open && m_file.write(bytes) != bytes.size())
-            m_open = false; // QSaveFile keeps the old file; commit fails
+        for (const auto &file : m_files) {
+            if (m_open && file->write(bytes) != bytes.size())
+                m_open = false; // QSaveFile keeps the old file; commit fails
+        }
     }
 
     void keep(const QString &text)
@@ -237,7 +257,7 @@ private:
         m_cut = true;
     }
 
-    QSaveFile m_file;
+    std::vector<std::unique_ptr<QSaveFile>> m_files;
     bool m_open = false;
     qsizetype m_lines = 0;
     QString &m_text;
@@ -258,7 +278,7 @@ CrvC_ReportBuilder::Environment CrvC_ReportBuilder::withDefaults(Environment env
 CrvC_ReportBuilder::CrvC_ReportBuilder(Environment environment)
     : m_env(withDefaults(std::move(environment)))
 {
-    m_data.reportPath = projectFilePath(QString::fromLatin1(ReportFileName));
+    m_data.reportPath = QFileInfo(projectFilePath(QString::fromLatin1(ReportFileName))).absoluteFilePath();
 }
 
 QString CrvC_ReportBuilder::projectDirectory()
@@ -307,16 +327,31 @@ void CrvC_ReportBuilder::buildReport(const QString &projectFileArg, QString desi
                              : projectFileArg + QLatin1String(".orb");
     m_data.projectGiven = !projectFileArg.isEmpty();
 
+    // A copy kept by an earlier build may have gone to the send step: it is
+    // left to CrvC_PageStore.
+    m_written = false;
+    m_pagePath.clear();
+    m_ownFolder.clear();
+    m_page.clear();
+    m_pageCut = false;
     if (designName.isEmpty() && m_env.askDesignName) {
         QString entered;
-        if (m_env.askDesignName(entered))
-            designName = entered.trimmed();
+        // Cancelled: the user wants no report of this design.
+        if (!m_env.askDesignName(entered))
+            return;
+        designName = entered.trimmed();
     }
 
-    m_written = false;
     BusyCursor busy(m_env.setBusy);
+    QStringList paths{m_data.reportPath};
+    if (m_env.pageFolder) {
+        m_ownFolder = m_env.pageFolder();
+        if (m_ownFolder.isEmpty())
+            return; // no copy of its own, nothing the send step could stand by
+        paths << m_ownFolder + QLatin1Char('/') + QLatin1String(ReportFileName);
+    }
     try {
-        PageWriter page(m_data.reportPath, m_page, m_pageCut);
+        PageWriter page(paths, m_page, m_pageCut);
         assemble(designName, page);
         m_written = page.commit();
     } catch (const std::bad_alloc &) {
@@ -324,7 +359,21 @@ void CrvC_ReportBuilder::buildReport(const QString &projectFileArg, QString desi
         m_written = false;
         m_pageCut = true;
     }
+    if (m_written)
+        m_pagePath = paths.last();
+    else
+        discardOwnCopy();
     releaseFreedMemory();
+}
+
+void CrvC_ReportBuilder::discardOwnCopy()
+{
+    if (m_ownFolder.isEmpty())
+        return;
+    CrvC_PageStore::remove(m_ownFolder);
+    if (m_pagePath.startsWith(m_ownFolder + QLatin1Char('/')))
+        m_pagePath.clear();
+    m_ownFolder.clear();
 }
 
 void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
@@ -348,7 +397,7 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
     // turn.
     const CrvC_ReportData start = m_data;
     CrvC_ReportData usage = start, macros = start, commands = start;
-    QByteArray history, help, cores, par, osim;
+    CrvC_SectionBuffer history, help, cores, par, osim;
     // Largest first: the usage XML for the calling thread, then what needs
     // most memory on the way, while the usage tables are still small.
     ReaderPool readers({
@@ -358,15 +407,14 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
             CrvC_CommandLog::checkFuseLog(fuseLog, commands);
             if (commands.commandHistory.isEmpty())
                 return;
-            const QString text = CrvC_CommandLog::commandLineHistorySection(commands);
+            CrvC_CommandLog::commandLineHistorySection(commands, history);
             commands.commandHistory.clear();
-            history = text.toUtf8();
         },
-        [&] { cores = CrvC_CoresStatistics().sectionText(coresReport).toUtf8(); },
-        [&] { help = CrvC_HelpViewerData().sectionText().toUtf8(); },
+        [&] { CrvC_CoresStatistics().writeSection(coresReport, cores); },
+        [&] { CrvC_HelpViewerData().writeSection(help); },
         [&] { CrvC_SynthesisReport::readMacroStatistics(synthesisReport, macros); },
-        [&] { par = CrvC_RunStatistics::parUsageSection(parPage).toUtf8(); },
-        [&] { osim = CrvC_RunStatistics::osimUsageSection(osimPage).toUtf8(); },
+        [&] { par += QStringView(CrvC_RunStatistics::parUsageSection(parPage)); },
+        [&] { osim += QStringView(CrvC_RunStatistics::osimUsageSection(osimPage)); },
     });
 
     const QString fileName = QString::fromLatin1(ReportFileName);
@@ -405,13 +453,12 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
     m_data.reportPinData.clear();
 
     if (!history.isEmpty())
-        page.utf8(history);
-    history.clear();
+        page.section(history);
     page(runStatistics);
-    page.utf8(help);
+    page.section(help);
     page(projectStatistics);
-    page.utf8(cores);
-    page.utf8(par);
-    page.utf8(osim);
+    page.section(cores);
+    page.section(par);
+    page.section(osim);
     page(QStringLiteral("</BODY></HTML>"));
 }

@@ -44,6 +44,10 @@ public:
         std::function<QString()> newIdentifier;
         // The user's own random identifier, made and kept on first use.
         std::function<QString()> randomId;
+        // A new empty folder for this build's own copy of the page (the copy
+        // the send step sends, CrvC_PageStore); empty when none could be made.
+        // Unset: the build keeps no copy, the page at reportPath is its page.
+        std::function<QString()> pageFolder;
     };
 
     // `environment` with the defaults for its unset clock and identifier
@@ -51,26 +55,37 @@ public:
     // CrvC_Settings::randomId. The one place these defaults are chosen.
     static Environment withDefaults(Environment environment);
 
-    // reportPath := projectFilePath(ReportFileName), resolved now.
+    // reportPath := projectFilePath(ReportFileName), made absolute now: a
+    // later change of the working directory does not move the page.
     explicit CrvC_ReportBuilder(Environment environment = Environment());
 
     // targetFamily := targetFamily, then buildReport.
     void createReport(const QString &projectFileArg, const QString &designName,
                       const QString &targetFamily);
 
-    // Builds the page and writes it to reportPath. The previous file is
-    // replaced only by a complete new one; a symbolic link at reportPath is
-    // never written through. Running out of memory ends the build with the
-    // page unwritten; the busy cursor is restored on every way out.
+    // Builds the page and writes it to reportPath, and the same bytes to the
+    // build's own copy when the environment gives a pageFolder. The previous
+    // file is replaced only by a complete new one; a symbolic link at
+    // reportPath is never written through. Running out of memory ends the
+    // build with the page unwritten; the busy cursor is restored on every way
+    // out. A design-name prompt that the user cancels ends the build before
+    // anything is read or written.
     void buildReport(const QString &projectFileArg, QString designName);
 
     // What the Contents tab shows: the page, or its first PageTextLimit
     // code units when pageCut().
     QString pageText() const { return m_page; }
     bool pageCut() const { return m_pageCut; }
-    // True when the last build wrote the file.
+    // True when the last build wrote the file (and its own copy).
     bool written() const { return m_written; }
     QString reportPath() const { return m_data.reportPath; }
+    // The file that holds exactly the bytes of the last build, for the send
+    // step: the build's own copy when it keeps one, otherwise reportPath.
+    // Absolute; empty when the build wrote nothing.
+    QString pagePath() const { return m_pagePath; }
+    // Removes the build's own copy (a page that will not be sent); the page
+    // at reportPath stays.
+    void discardOwnCopy();
 
     // projectDirectory() + "/" + name, or name when there is no project directory.
     static QString projectFilePath(const QString &name);
@@ -98,6 +113,8 @@ private:
     Environment m_env;
     CrvC_ReportData m_data;
     QString m_page;
+    QString m_pagePath;
+    QString m_ownFolder;
     bool m_pageCut = false;
     bool m_written = false;
 };

@@ -87,6 +87,8 @@ CrvC_XmlDepthGuard::Outcome CrvC_XmlDepthGuard::parseFile(const QString &path,
 
     QXmlInputSource source;
     source.setData(xml);
+    // The source holds its own decoded copy; the bytes are no longer needed.
+    xml = QByteArray();
     DepthLimitedHandler limited(handler, maxDepth);
     QXmlSimpleReader reader;
     reader.setContentHandler(&limited);

@@ -123,11 +123,11 @@ echo "== what the receiver stored ($DEMO/received)"
 sed 's/^/   /' "$DEMO/receiver.log"
 found=0
 for folder in "$DEMO/received"/*/; do
-    [ -f "$folder/fields.txt" ] || continue
+    [ -f "$folder/@fields.txt" ] || continue
     found=1
     echo "-- $folder"
-    sed 's/^/   /' "$folder/fields.txt"
-    stored="$folder$(sed -n 's/^stored_as=//p' "$folder/fields.txt")"
+    sed 's/^/   /' "$folder/@fields.txt"
+    stored="$folder$(sed -n 's/^stored_as=//p' "$folder/@fields.txt")"
     if cmp -s "$stored" "$PAGE"; then
         echo "   the stored report is the page, byte for byte"
     else

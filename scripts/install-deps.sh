@@ -6,7 +6,7 @@ set -e
 PACKAGES="cmake g++ make pkg-config
 qt6-base-dev qt6-5compat-dev libqt6sql6-sqlite libgl-dev
 libsqlite3-dev
-libcurl4-openssl-dev libcpp-httplib-dev libssl-dev openssl
+libcurl4-openssl-dev libcpp-httplib-dev libssl-dev openssl ca-certificates
 libpacparser-dev
 clang libclang-rt-14-dev llvm"
 

@@ -20,10 +20,17 @@ QStringList CrvC_DataCollectionEmail::emailTools()
 bool CrvC_DataCollectionEmail::send(const QString &tool, const QString &to, const QString &subject,
                                     const QString &body, const QString &file)
 {
-    const QStringList words =
-        commandWords(m_impl->toolCommand(tool), m_impl->composeArgument(tool, to, subject, body, file));
-    if (words.size() < 2)
+    m_tool = tool;
+    const QStringList arguments =
+        canPassFile(file) ? m_impl->composeArguments(tool, to, subject, body, file) : QStringList();
+    if (arguments.isEmpty()) {
+        CrvC_UserNotice::warning(
+            tr("The report cannot be handed to the E-mail Tool unchanged."),
+            tr("Its path %1 holds a character, such as a line break, that cannot be passed on. Send the "
+               "report over HTTPS, or move the project to a folder whose path has none.")
+                .arg(file));
         return false;
+    }
 
     // The mail program runs detached: it may stay open after the host has
     // quit, and no process object is left behind for it. Nobody reads its
@@ -31,58 +38,28 @@ bool CrvC_DataCollectionEmail::send(const QString &tool, const QString &to, cons
     // startDetached() returns, while this object still exists (callers drop
     // it as soon as send() returns).
     QProcess process;
-    process.setProgram(words.first());
-    process.setArguments(words.mid(1));
+    process.setProgram(tool);
+    process.setArguments(arguments);
     process.setStandardInputFile(QProcess::nullDevice());
     if (process.startDetached())
         return true;
+    m_startError = process.errorString();
     onProcessError(QProcess::FailedToStart);
     return false;
 }
 
-QStringList CrvC_DataCollectionEmail::commandWords(const QString &command, const QString &argument)
+bool CrvC_DataCollectionEmail::canPassFile(const QString &file)
 {
-    const int at = command.indexOf(QLatin1String("%1"));
-    if (at < 0)
-        return QStringList();
-    QString line = command;
-    line.replace(at, 2, argument);
-    return splitCommandLine(line);
-}
-
-QStringList CrvC_DataCollectionEmail::splitCommandLine(const QString &command)
-{
-    QStringList words;
-    QString word;
-    bool inQuotes = false;
-    auto endWord = [&words, &word]() {
-        if (!word.isEmpty())
-            words << word;
-        word.clear();
-    };
-    for (const QChar c : command) {
-        if (c.unicode() == 0)
-            break;
-        if (inQuotes) {
-            if (c == QLatin1Char('"')) {
-                inQuotes = false;
-                endWord();
-            } else {
-                word += c;
-            }
-        } else if (c == QLatin1Char('"')) {
-            inQuotes = true;
-        } else if (c == QLatin1Char(' ') || c == QLatin1Char('\t')) {
-            endWord();
-        } else {
-            word += c;
-        }
+    if (!file.startsWith(QLatin1Char('/')))
+        return false;
+    for (const QChar c : file) {
+        if (c.category() == QChar::Other_Control || c == QChar::ReplacementCharacter)
+            return false;
     }
-    endWord();
-    return words;
+    return true;
 }
 
 void CrvC_DataCollectionEmail::onProcessError(QProcess::ProcessError)
 {
-    CrvC_UserNotice::warning(tr("Could not run E-mail Tool:\n"));
+    CrvC_UserNotice::warning(tr("Could not run E-mail Tool:\n") + m_tool, m_startError);
 }

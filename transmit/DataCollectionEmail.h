@@ -12,8 +12,10 @@ class CrvC_DataCollectionEmailImpl;
 // Sends the report through the user's own mail program: composes a message
 // to the collection mailbox with the report attached and starts the program.
 // This build uses the Unix implementation (CrvC_DataCollectionUnixImpl).
-// A program that cannot be started is reported through onProcessError before
-// send() returns, so the object may be dropped right after.
+// The program gets its arguments as a list, each one whole. A report path
+// that cannot be passed on unchanged is refused with a warning, and a program
+// that cannot be started is reported, with the reason, through onProcessError;
+// both before send() returns, so the object may be dropped right after.
 class CrvC_DataCollectionEmail : public QObject
 {
     Q_OBJECT
@@ -32,20 +34,17 @@ public:
     bool send(const QString &tool, const QString &to, const QString &subject,
               const QString &body, const QString &file);
 
-    // The command line `command` with its first "%1" replaced by `argument`
-    // ("%1" is matched case-sensitively; a second one stays), split into
-    // words. Empty when the command holds no "%1".
-    static QStringList commandWords(const QString &command, const QString &argument);
-
-    // Splits a command line into words: a space or tab ends a word; a
-    // quotation mark opens a quoted part that keeps spaces and tabs, and its
-    // closing mark ends the word. Quotation marks are dropped, empty words
-    // skipped, a NUL character ends the text.
-    static QStringList splitCommandLine(const QString &command);
+    // False for a report path that no mail program could be given
+    // unchanged: not absolute, holding a control character (a line break
+    // would end a compose field, NUL an argument), or a name that did not
+    // decode (U+FFFD).
+    static bool canPassFile(const QString &file);
 
 public Q_SLOTS:
     void onProcessError(QProcess::ProcessError error);
 
 private:
     std::unique_ptr<CrvC_DataCollectionEmailImpl> m_impl;
+    QString m_tool;       // the program of the last send
+    QString m_startError; // why it could not be started
 };

@@ -2,20 +2,12 @@
 
 #include <QDir>
 #include <QFileInfo>
+#include <QUrl>
 
 namespace {
 
 const char *const ComposeNames[] = {"netscape", "mozilla", "thunderbird"};
 const char *const XdgEmailName = "xdg-email";
-
-// A value inside one quoted word of the command line: the word splitting
-// knows no escape for the quotation mark, so one would cut the word short.
-QString quoted(const QString &value)
-{
-    QString text = value;
-    text.remove(QLatin1Char('"'));
-    return QLatin1Char('"') + text + QLatin1Char('"');
-}
 
 } // namespace
 
@@ -52,29 +44,33 @@ QStringList CrvC_DataCollectionUnixImpl::emailTools()
     return m_tools;
 }
 
-QString CrvC_DataCollectionUnixImpl::composeArgument(const QString &tool, const QString &to,
-                                                     const QString &subject, const QString &body,
-                                                     const QString &file)
+QStringList CrvC_DataCollectionUnixImpl::composeArguments(const QString &tool, const QString &to,
+                                                          const QString &subject, const QString &body,
+                                                          const QString &file)
 {
     if (isXdgEmail(tool)) {
-        QString argument = QLatin1String("--subject ") + quoted(subject);
+        QStringList arguments{QStringLiteral("--subject"), subject};
         if (!body.isEmpty())
-            argument += QLatin1String(" --body ") + quoted(body);
-        argument += QLatin1String(" --attach ") + quoted(file) + QLatin1Char(' ') + quoted(to);
-        return argument;
+            arguments << QStringLiteral("--body") << body;
+        return arguments << QStringLiteral("--attach") << file << to;
     }
-    return QStringLiteral("to=%1,subject=%2,body=%3,attachment=file://%4").arg(to, subject, body, file);
+    const QString request = composeRequest(to, subject, body, file);
+    if (request.isEmpty())
+        return QStringList();
+    return QStringList{QStringLiteral("-compose"), request};
 }
 
-QString CrvC_DataCollectionUnixImpl::toolCommand(const QString &tool)
+QString CrvC_DataCollectionUnixImpl::composeRequest(const QString &to, const QString &subject,
+                                                    const QString &body, const QString &file)
 {
-    // A program path with a space or tab is quoted, or it would split in two.
-    const QString program = tool.contains(QLatin1Char(' ')) || tool.contains(QLatin1Char('\t'))
-                                ? QLatin1Char('"') + tool + QLatin1Char('"')
-                                : tool;
-    if (isXdgEmail(tool))
-        return program + QLatin1String(" %1");
-    return program + QLatin1String(" -compose \"%1\"");
+    for (const QString *value : {&to, &subject, &body}) {
+        if (value->contains(QLatin1Char('\'')))
+            return QString();
+    }
+    const QString attachment =
+        QLatin1String("file://") + QString::fromLatin1(QUrl::toPercentEncoding(file, "/"));
+    // One arg() call, so that a "%1" inside a value stays as it is.
+    return QStringLiteral("to='%1',subject='%2',body='%3',attachment='%4'").arg(to, subject, body, attachment);
 }
 
 bool CrvC_DataCollectionUnixImpl::isXdgEmail(const QString &tool)

@@ -6,7 +6,6 @@
 #include <QDir>
 #include <QFile>
 #include <QFileInfo>
-#include <QProcess>
 #include <QStandardPaths>
 #include <QTextStream>
 
@@ -15,41 +14,37 @@ namespace {
 const char *const GnomeSchema = "org.gnome.system.proxy";
 const qint64 MaxKioslavercBytes = 1024 * 1024;
 
-// Runs gsettings with `arguments`; false when it cannot run, fails or hangs.
-bool runGsettings(const QString &program, const QStringList &arguments, QString *output)
+// gsettings prints one value per call; anything longer is not its answer.
+const qint64 MaxGsettingsOutput = 64 * 1024;
+
+// Runs gsettings with `arguments`; false when it cannot run, fails or is
+// still running at the deadline.
+bool runGsettings(const QString &program, const QStringList &arguments, const CrvC_ProxyDeadline &deadline,
+                  QString *output)
 {
-    QProcess process;
-    process.setProcessChannelMode(QProcess::SeparateChannels);
-    process.start(program, arguments, QIODevice::ReadOnly);
-    if (!process.waitForStarted(3000))
-        return false;
-    if (!process.waitForFinished(3000)) {
-        process.kill();
-        process.waitForFinished(1000);
-        return false;
-    }
-    if (process.exitStatus() != QProcess::NormalExit || process.exitCode() != 0)
+    QByteArray printed;
+    if (!deadline.run(program, arguments, &printed, MaxGsettingsOutput))
         return false;
     if (output)
-        *output = QString::fromUtf8(process.readAllStandardOutput()).trimmed();
+        *output = QString::fromUtf8(printed).trimmed();
     return true;
 }
 
 } // namespace
 
-CrvC_DesktopProxySettings CrvC_DesktopProxySettings::current()
+CrvC_DesktopProxySettings CrvC_DesktopProxySettings::current(const CrvC_ProxyDeadline &deadline)
 {
     const QString desktop = qEnvironmentVariable("XDG_CURRENT_DESKTOP");
     if (desktop.contains(QLatin1String("KDE"), Qt::CaseInsensitive))
         return fromKioslaverc(kioslavercPath());
     bool gnomeAvailable = false;
-    const CrvC_DesktopProxySettings gnome = fromGnome(&gnomeAvailable);
+    const CrvC_DesktopProxySettings gnome = fromGnome(&gnomeAvailable, deadline);
     if (gnomeAvailable)
         return gnome;
     return fromKioslaverc(kioslavercPath());
 }
 
-CrvC_DesktopProxySettings CrvC_DesktopProxySettings::fromGnome(bool *available)
+CrvC_DesktopProxySettings CrvC_DesktopProxySettings::fromGnome(bool *available, const CrvC_ProxyDeadline &deadline)
 {
     if (available)
         *available = false;
@@ -59,18 +54,21 @@ CrvC_DesktopProxySettings CrvC_DesktopProxySettings::fromGnome(bool *available)
     const QString schema = QString::fromLatin1(GnomeSchema);
     const QString httpsSchema = schema + QLatin1String(".https");
     // list-keys fails when the schema is not installed; "get" would abort.
-    if (!runGsettings(program, {QStringLiteral("list-keys"), schema}, nullptr))
+    if (!runGsettings(program, {QStringLiteral("list-keys"), schema}, deadline, nullptr))
         return CrvC_DesktopProxySettings();
     if (available)
         *available = true;
 
     QString mode, autoconfigUrl, host, port;
-    runGsettings(program, {QStringLiteral("get"), schema, QStringLiteral("mode")}, &mode);
-    if (gsettingsValue(mode) == QLatin1String("auto"))
-        runGsettings(program, {QStringLiteral("get"), schema, QStringLiteral("autoconfig-url")}, &autoconfigUrl);
-    else if (gsettingsValue(mode) == QLatin1String("manual")) {
-        runGsettings(program, {QStringLiteral("get"), httpsSchema, QStringLiteral("host")}, &host);
-        runGsettings(program, {QStringLiteral("get"), httpsSchema, QStringLiteral("port")}, &port);
+    auto get = [&](const QString &group, const char *key, QString *value) {
+        runGsettings(program, {QStringLiteral("get"), group, QLatin1String(key)}, deadline, value);
+    };
+    get(schema, "mode", &mode);
+    if (gsettingsValue(mode) == QLatin1String("auto")) {
+        get(schema, "autoconfig-url", &autoconfigUrl);
+    } else if (gsettingsValue(mode) == QLatin1String("manual")) {
+        get(httpsSchema, "host", &host);
+        get(httpsSchema, "port", &port);
     }
     return fromGnomeValues(mode, autoconfigUrl, host, port);
 }

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "ProxyDeadline.h"
+
 #include <QString>
 
 // The desktop's proxy settings as connection flags (CrvC_ProxySource::
@@ -20,11 +22,13 @@ public:
 
     // The settings of the user's desktop: KDE's when XDG_CURRENT_DESKTOP names
     // KDE, otherwise GNOME's; when GNOME's cannot be read (no gsettings, no
-    // schema), KDE's file. Empty settings when neither has any.
-    static CrvC_DesktopProxySettings current();
+    // schema), KDE's file. Empty settings when neither has any. gsettings
+    // runs no longer than `deadline`.
+    static CrvC_DesktopProxySettings current(const CrvC_ProxyDeadline &deadline = CrvC_ProxyDeadline());
 
     // GNOME: runs gsettings when it exists and the schema is installed.
-    static CrvC_DesktopProxySettings fromGnome(bool *available = nullptr);
+    static CrvC_DesktopProxySettings fromGnome(bool *available = nullptr,
+                                               const CrvC_ProxyDeadline &deadline = CrvC_ProxyDeadline());
     // GNOME's values (as gsettings prints them, e.g. "'auto'") to settings.
     static CrvC_DesktopProxySettings fromGnomeValues(const QString &mode, const QString &autoconfigUrl,
                                                      const QString &httpsHost, const QString &httpsPort);

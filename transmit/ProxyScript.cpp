@@ -5,72 +5,72 @@
 
 #include <QCoreApplication>
 #include <QFileInfo>
-#include <QProcess>
+#include <QRegularExpression>
 #include <QTemporaryFile>
 
 namespace {
 
 const char *const EvaluatorName = "corvid-pac";
 
-// Waits for `process` up to `limitMs`; kills it when it takes longer.
-bool finishWithin(QProcess &process, int limitMs)
-{
-    if (!process.waitForStarted(limitMs))
-        return false;
-    if (!process.waitForFinished(limitMs)) {
-        process.kill();
-        process.waitForFinished(2000);
-        return false;
-    }
-    return process.exitStatus() == QProcess::NormalExit && process.exitCode() == 0;
-}
-
 } // namespace
 
-QString CrvC_ProxyScript::run(const QString &scriptUrl, const QString &url, const QString &host)
+QString CrvC_ProxyScript::run(const QString &scriptUrl, const QString &url, const QString &host,
+                              const CrvC_ProxyDeadline &deadline)
 {
     if (scriptUrl.isEmpty())
         return QString();
+    QByteArray text;
+    if (!download(scriptUrl, &text, deadline))
+        return QString();
     QTemporaryFile script; // removed when it goes out of scope
-    if (!script.open()) {
+    if (!script.open() || script.write(text) != text.size() || !script.flush()) {
         Port_MsgManData::debugStub("Proxy script: no temporary file\n");
         return QString();
     }
     script.close();
-    if (!download(scriptUrl, script.fileName()))
-        return QString();
-    return evaluate(script.fileName(), url, host);
+    return evaluate(script.fileName(), url, host, deadline);
 }
 
 QString CrvC_ProxyScript::evaluate(const QString &scriptFile, const QString &url, const QString &host,
-                                   int timeLimitMs)
+                                   const CrvC_ProxyDeadline &deadline)
 {
     const QString program = evaluatorProgram();
     if (program.isEmpty()) {
         Port_MsgManData::debugStub("Proxy script: %s not found\n", EvaluatorName);
         return QString();
     }
-    QProcess evaluator;
-    evaluator.setProcessChannelMode(QProcess::SeparateChannels);
-    evaluator.start(program, {scriptFile, url, host}, QIODevice::ReadOnly);
-    if (!finishWithin(evaluator, timeLimitMs)) {
+    QByteArray output;
+    const bool answered = deadline.within(TimeLimitMs).run(program, {scriptFile, url, host}, &output, MaxAnswerBytes);
+    const QString answer = answered ? usableAnswer(output) : QString();
+    if (answer.isEmpty())
         Port_MsgManData::debugStub("Proxy script: no answer from %s\n", qUtf8Printable(scriptFile));
-        return QString();
-    }
-    return QString::fromUtf8(evaluator.readAllStandardOutput()).trimmed();
+    return answer;
 }
 
-bool CrvC_ProxyScript::download(const QString &scriptUrl, const QString &path)
+bool CrvC_ProxyScript::download(const QString &scriptUrl, QByteArray *script, const CrvC_ProxyDeadline &deadline)
 {
-    QProcess transfer;
-    transfer.setStandardOutputFile(path, QIODevice::Truncate);
-    transfer.setStandardErrorFile(QProcess::nullDevice());
-    transfer.start(QStringLiteral("vancurl"), {scriptUrl}, QIODevice::ReadOnly);
-    if (!finishWithin(transfer, DownloadLimitMs)) {
-        Port_MsgManData::debugStub("Proxy script: could not download %s\n", qUtf8Printable(scriptUrl));
+    script->clear();
+    if (!deadline.run(QStringLiteral("vancurl"), {scriptUrl}, script, MaxScriptBytes) || script->isEmpty()) {
+        if (script->size() > MaxScriptBytes)
+            Port_MsgManData::debugStub("Proxy script: %s is larger than %lld bytes\n", qUtf8Printable(scriptUrl),
+                                       static_cast<long long>(MaxScriptBytes));
+        else
+            Port_MsgManData::debugStub("Proxy script: could not download %s\n", qUtf8Printable(scriptUrl));
+        script->clear();
         return false;
     }
-    return QFileInfo(path).size() > 0;
+    return true;
+}
+
+QString CrvC_ProxyScript::usableAnswer(const QByteArray &output)
+{
+    const QString answer = QString::fromUtf8(output).trimmed();
+    static const QRegularExpression entry(
+        QStringLiteral("^(DIRECT|PROXY[ \\t]+([A-Za-z0-9._-]+|\\[[0-9A-Fa-f:.]+\\])(:[0-9]{1,5})?)$"),
+        QRegularExpression::CaseInsensitiveOption);
+    if (!entry.match(answer.section(QLatin1Char(';'), 0, 0).trimmed()).hasMatch())
+        return QString();
+    return answer;
 }
 
 QString CrvC_ProxyScript::evaluatorProgram()

@@ -20,7 +20,8 @@ public:
 
     virtual ~CrvC_ProxySource();
 
-    // Proxy of the user's environment variables, or empty.
+    // Proxy of the user's environment variables, "DIRECT" when they exclude
+    // the maker's server from it, or empty.
     virtual QString environmentProxy() = 0;
     // The ConnectionFlag bits of the desktop's settings.
     virtual int connectionFlags() = 0;

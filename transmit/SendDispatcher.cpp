@@ -1,6 +1,7 @@
 #include "SendDispatcher.h"
 
 #include "DataCollectionEmail.h"
+#include "MakerServer.h"
 #include "SendRecorder.h"
 #include "SendUsingSSL.h"
 #include "project/CorvidSettings.h"
@@ -35,10 +36,11 @@ void startMethod(CrvC_SendDispatcher::Method method, const QString &tool, const 
     if (email.send(tool, mailbox, CrvC_SendDispatcher::emailSubject(), QString(), file))
         CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Handed, tool);
     else
-        CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Failed,
-                                  QCoreApplication::translate("CrvC_SendDispatcher",
-                                                              "the mail program %1 could not be started")
-                                      .arg(tool));
+        CrvC_SendRecorder::finish(
+            ticket, CrvC_SendHistory::State::Failed,
+            CrvC_DataCollectionEmail::canPassFile(file)
+                ? QCoreApplication::translate("CrvC_SendDispatcher", "the mail program %1 could not be started").arg(tool)
+                : QCoreApplication::translate("CrvC_SendDispatcher", "its path cannot be passed to a mail program"));
 }
 
 } // namespace
@@ -60,14 +62,18 @@ QString CrvC_SendDispatcher::emailSubject()
 
 bool CrvC_SendDispatcher::sendReport(const QString &reportFile)
 {
-    if (CrvC_Settings::useSsl()) {
+    return send(storedChoice(), reportFile);
+}
+
+bool CrvC_SendDispatcher::send(const Choice &choice, const QString &reportFile)
+{
+    if (choice.useSsl) {
         startMethod(Method::Upload, QString(), reportFile);
         return true;
     }
-    const QString tool = CrvC_Settings::selectedEmailTool();
-    if (tool.isEmpty())
+    if (choice.emailTool.isEmpty())
         return false;
-    startMethod(Method::Email, tool, reportFile);
+    startMethod(Method::Email, choice.emailTool, reportFile);
     return true;
 }
 
@@ -92,4 +98,20 @@ void CrvC_SendDispatcher::storeChoice(const Choice &initial, const Choice &chose
     CrvC_Settings::setValue(CrvC_Settings::DontShowSendToDlg, chosen.dontShowAgain);
     if (chosen.emailTool != initial.emailTool)
         CrvC_Settings::setValue(CrvC_Settings::SelectedEmailTool, chosen.emailTool);
+}
+
+CrvC_SendDispatcher::Destination CrvC_SendDispatcher::destination()
+{
+    // The same decisions and values as sendWithoutAsking and the upload's
+    // form fields.
+    Destination to;
+    const bool useSsl = CrvC_Settings::useSsl();
+    to.emailTool = CrvC_Settings::selectedEmailTool();
+    to.method = useSsl ? Method::Upload : Method::Email;
+    to.asks = !useSsl && (!CrvC_Settings::dontShowSendToDlg() || to.emailTool.isEmpty());
+    to.server = CrvC_MakerServer::host();
+    to.registrationId = CrvC_SendUsingSSL::registrationId();
+    to.domain = CrvC_SendUsingSSL::domainName();
+    to.mailbox = emailRecipient();
+    return to;
 }

@@ -38,6 +38,11 @@ public:
     // program is remembered: then nothing is started.
     static bool sendReport(const QString &reportFile);
 
+    // Starts the method of `choice` for `reportFile` and stores nothing: the
+    // upload when `useSsl`, otherwise the e-mail through `emailTool`. False
+    // when that is empty: then nothing is started.
+    static bool send(const Choice &choice, const QString &reportFile);
+
     // Sends without asking when the user asked for automatic sending
     // ("DontShowSendToDlg") or the upload is the method, and sendReport
     // started something. False means the send method dialog must ask.
@@ -55,4 +60,18 @@ public:
     // The e-mail's recipient and subject.
     static QString emailRecipient();
     static QString emailSubject();
+
+    // Where the send step takes a report with the stored settings, and what
+    // travels with it: what the user is told before consenting.
+    struct Destination
+    {
+        Method method = Method::Upload;
+        bool asks = false;      // the send method dialog asks first
+        QString server;         // the maker's server (host name) of the upload
+        QString registrationId; // sent beside the page as "regid="
+        QString domain;         // sent beside the page as "domain="
+        QString mailbox;        // the e-mail's recipient
+        QString emailTool;      // the remembered mail program
+    };
+    static Destination destination();
 };

@@ -2,6 +2,7 @@
 
 #include "transmit/MakerServer.h"
 #include "transmit/ProxyDiscovery.h"
+#include "transmit/SendFailure.h"
 #include "transmit/UserNotice.h"
 
 #include "host/Env.h"
@@ -11,6 +12,7 @@
 #include <QBuffer>
 #include <QCoreApplication>
 #include <QEventLoopLocker>
+#include <QFileInfo>
 #include <QRegularExpression>
 #include <QTimer>
 #include <QUrl>
@@ -24,6 +26,7 @@ const char *const CrvC_SendUsingSSL::AccessCode = "v9orn";
 const char *const CrvC_SendUsingSSL::RedirectPath =
     "/cgi-bin/SW_Docs_Redirect/sw_docs_redirect?topic=corvidupload";
 const char *const CrvC_SendUsingSSL::CaBundle = "reports/ca-cert-bundle.crt";
+const char *const CrvC_SendUsingSSL::SystemCaBundle = "/etc/ssl/certs/ca-certificates.crt";
 const char *const CrvC_SendUsingSSL::FailureText = QT_TRANSLATE_NOOP(
     "CrvC_SendUsingSSL",
     "Failed to send data through SSL. Please make sure your proxy settings are correct under "
@@ -32,17 +35,14 @@ const char *const CrvC_SendUsingSSL::FailureText = QT_TRANSLATE_NOOP(
 
 namespace {
 
-QString caBundlePath()
-{
-    return QString::fromUtf8(Port_Env::GetDataFileName(CrvC_SendUsingSSL::CaBundle).c_str());
-}
-
 QStringList connectionArguments(const QString &proxy)
 {
     QStringList arguments;
     if (!proxy.isEmpty())
         arguments << QStringLiteral("--proxy") << proxy;
-    arguments << QStringLiteral("--cacert") << caBundlePath();
+    const QString bundle = CrvC_SendUsingSSL::caBundlePath();
+    if (!bundle.isEmpty())
+        arguments << QStringLiteral("--cacert") << bundle;
     return arguments;
 }
 
@@ -61,10 +61,10 @@ const qint64 MaxLookupAnswer = 1024 * 1024;
 const int MaxUploadAnswer = 4096;
 
 // The HTTP status in vancurl's reason line, 0 when it names none.
-int httpStatusIn(const QByteArray &errors)
+int httpStatusIn(const QString &reason)
 {
-    static const QRegularExpression status(QStringLiteral("HTTP status (\\d+)"));
-    return status.match(QString::fromUtf8(errors)).captured(1).toInt();
+    static const QRegularExpression status(QStringLiteral("\\bHTTP status (\\d{3})\\b"));
+    return status.match(reason).captured(1).toInt();
 }
 
 std::shared_ptr<QEventLoopLocker> keepApplicationAlive()
@@ -77,7 +77,8 @@ std::shared_ptr<QEventLoopLocker> keepApplicationAlive()
 } // namespace
 
 CrvC_SendUsingSSL::CrvC_SendUsingSSL()
-    : CrvC_SendUsingSSL(CrvC_ProxyDiscovery::findProxy())
+    : QObject(nullptr)
+    , m_proxyKnown(false)
 {
 }
 
@@ -88,6 +89,17 @@ CrvC_SendUsingSSL::CrvC_SendUsingSSL(const QString &proxy)
 }
 
 CrvC_SendUsingSSL::~CrvC_SendUsingSSL() = default;
+
+QString CrvC_SendUsingSSL::caBundlePath()
+{
+    const QString installed = QString::fromUtf8(Port_Env::GetDataFileName(CaBundle).c_str());
+    if (QFileInfo(installed).isFile())
+        return installed;
+    const QString named = qEnvironmentVariable("SSL_CERT_FILE");
+    if (!named.isEmpty() && QFileInfo(named).isFile())
+        return named;
+    return QFileInfo(QLatin1String(SystemCaBundle)).isFile() ? QString::fromLatin1(SystemCaBundle) : QString();
+}
 
 QString CrvC_SendUsingSSL::redirectUrl()
 {
@@ -115,14 +127,30 @@ QStringList CrvC_SendUsingSSL::uploadArguments(const QString &url) const
 
 void CrvC_SendUsingSSL::SendFile(const QString &file)
 {
+    // Recorded before anything is looked up or sent.
+    if (!m_ticket)
+        m_ticket = CrvC_SendRecorder::begin(CrvC_SendHistory::Method::Upload, file, CrvC_MakerServer::baseUrl());
+    if (!m_proxyKnown) {
+        // The proxy is found in the background (it may take seconds); the
+        // send goes on with its answer.
+        if (m_discovery)
+            return;
+        m_keepAlive = keepApplicationAlive();
+        m_discovery = new CrvC_ProxyDiscovery(this);
+        connect(m_discovery, &CrvC_ProxyDiscovery::finished, this, [this, file](const QString &proxy) {
+            m_proxy = proxy;
+            m_proxyKnown = true;
+            SendFile(file);
+        });
+        m_discovery->start();
+        return;
+    }
     if (m_lookupProcess) {
         Port_MsgManData::debugStub("Corvid ERROR: a send is already under way for %s\n",
                                    qUtf8Printable(m_reportFile));
         return;
     }
     m_reportFile = file;
-    if (!m_ticket)
-        m_ticket = CrvC_SendRecorder::begin(CrvC_SendHistory::Method::Upload, file, CrvC_MakerServer::baseUrl());
     m_keepAlive = keepApplicationAlive();
     const QStringList arguments = redirectArguments();
     for (const QString &argument : arguments)
@@ -154,7 +182,10 @@ void CrvC_SendUsingSSL::lookupFailedToStart()
     Port_MsgManData::debugStub("Corvid ERROR: cannot start %s: %s\n", ProgramName,
                                qUtf8Printable(m_lookupProcess->errorString()));
     Port_MsgManData::debugStub("Corvid ERROR: Redirected URL is empty.\n");
-    reportFailure(m_ticket, failureCause(true, NotStarted, QByteArray()), NotStarted, QByteArray());
+    CrvC_SendFailure::Run run = lookupRun();
+    run.started = false;
+    run.reason = m_lookupProcess->errorString();
+    reportFailure(m_ticket, run);
     m_lookupProcess->deleteLater();
     deleteLater();
 }
@@ -165,21 +196,21 @@ void CrvC_SendUsingSSL::LaunchSSLProcess()
         return;
     m_ended = true;
     QString address;
-    QByteArray errors;
-    const int status = exitStatusOf(m_lookupProcess);
-    if (status == 0) {
+    CrvC_SendFailure::Run run = lookupRun();
+    run.exitStatus = exitStatusOf(m_lookupProcess);
+    if (run.exitStatus == 0) {
         m_lookupProcess->setReadChannel(QProcess::StandardOutput);
         address = uploadAddress(m_lookupProcess);
     } else {
         // An error page or a half-read answer names no address to trust.
-        errors = forDebug(m_lookupProcess->readAllStandardError());
-        Port_MsgManData::debugStub("Corvid ERROR: the address lookup failed (exit status %d): %s\n", status,
-                                   errors.constData());
+        run.reason = QString::fromUtf8(forDebug(m_lookupProcess->readAllStandardError()));
+        Port_MsgManData::debugStub("Corvid ERROR: the address lookup failed (exit status %d): %s\n",
+                                   run.exitStatus, qUtf8Printable(run.reason));
     }
 
     if (address.isEmpty()) {
         Port_MsgManData::debugStub("Corvid ERROR: Redirected URL is empty.\n");
-        reportFailure(m_ticket, failureCause(true, status, errors), status, errors);
+        reportFailure(m_ticket, run);
     } else {
         Port_MsgManData::debugStub("Corvid: SSL process to %s has started.\n", qUtf8Printable(address));
         startUpload(address);
@@ -205,6 +236,10 @@ void CrvC_SendUsingSSL::startUpload(const QString &address)
     CrvC_SendRecorder::uploadStarted(m_ticket, address, field(QStringLiteral("domain")),
                                      field(QStringLiteral("regid")));
     const CrvC_SendRecorder::Ticket ticket = m_ticket;
+    CrvC_SendFailure::Run run;
+    run.step = CrvC_SendFailure::Step::Upload;
+    run.url = address;
+    run.proxy = m_proxy;
     std::shared_ptr<QEventLoopLocker> keepAlive = m_keepAlive;
     auto answerStart = std::make_shared<QByteArray>();
     auto keepAnswerStart = [upload, answerStart] {
@@ -213,32 +248,46 @@ void CrvC_SendUsingSSL::startUpload(const QString &address)
             answerStart->append(chunk.left(MaxUploadAnswer - answerStart->size()));
     };
     connect(upload, &QProcess::readyReadStandardOutput, upload, keepAnswerStart);
-    connect(upload, &QProcess::finished, upload, [upload, ticket, keepAlive, answerStart, keepAnswerStart] {
-        keepAnswerStart();
-        const QByteArray answer = forDebug(*answerStart);
-        const QByteArray errors = forDebug(upload->readAllStandardError());
-        const int status = exitStatusOf(upload);
-        Port_MsgManData::debugStub("Corvid: SSL upload ended with exit status %d: %s\n", status,
-                                   answer.constData());
-        if (status == 0) {
-            CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Sent, QString::fromUtf8(answer), 0);
-        } else {
-            Port_MsgManData::debugStub("Corvid ERROR: SSL upload failed: %s\n", errors.constData());
-            reportFailure(ticket, failureCause(false, status, errors), status, errors);
-        }
-        upload->deleteLater();
-    });
-    connect(upload, &QProcess::errorOccurred, upload, [upload, ticket, keepAlive](QProcess::ProcessError error) {
-        if (error != QProcess::FailedToStart)
-            return; // the finished signal follows
-        Port_MsgManData::debugStub("Corvid ERROR: cannot start %s: %s\n", ProgramName,
-                                   qUtf8Printable(upload->errorString()));
-        upload->deleteLater();
-        QTimer::singleShot(0, [ticket, keepAlive] {
-            reportFailure(ticket, failureCause(false, NotStarted, QByteArray()), NotStarted, QByteArray());
-        });
-    });
+    connect(upload, &QProcess::finished, upload,
+            [upload, ticket, run, keepAlive, answerStart, keepAnswerStart] {
+                keepAnswerStart();
+                const QByteArray answer = forDebug(*answerStart);
+                CrvC_SendFailure::Run ended = run;
+                ended.exitStatus = exitStatusOf(upload);
+                ended.reason = QString::fromUtf8(forDebug(upload->readAllStandardError()));
+                Port_MsgManData::debugStub("Corvid: SSL upload ended with exit status %d: %s\n",
+                                           ended.exitStatus, answer.constData());
+                if (ended.exitStatus == 0) {
+                    CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Sent, QString::fromUtf8(answer), 0);
+                } else {
+                    Port_MsgManData::debugStub("Corvid ERROR: SSL upload failed: %s\n",
+                                               qUtf8Printable(ended.reason));
+                    reportFailure(ticket, ended);
+                }
+                upload->deleteLater();
+            });
+    connect(upload, &QProcess::errorOccurred, upload,
+            [upload, ticket, run, keepAlive](QProcess::ProcessError error) {
+                if (error != QProcess::FailedToStart)
+                    return; // the finished signal follows
+                Port_MsgManData::debugStub("Corvid ERROR: cannot start %s: %s\n", ProgramName,
+                                           qUtf8Printable(upload->errorString()));
+                CrvC_SendFailure::Run notStarted = run;
+                notStarted.started = false;
+                notStarted.reason = upload->errorString();
+                upload->deleteLater();
+                QTimer::singleShot(0, [ticket, notStarted, keepAlive] { reportFailure(ticket, notStarted); });
+            });
     upload->start(QLatin1String(ProgramName), arguments, QIODevice::ReadWrite);
+}
+
+CrvC_SendFailure::Run CrvC_SendUsingSSL::lookupRun() const
+{
+    CrvC_SendFailure::Run run;
+    run.step = CrvC_SendFailure::Step::Lookup;
+    run.url = redirectUrl();
+    run.proxy = m_proxy;
+    return run;
 }
 
 int CrvC_SendUsingSSL::exitStatusOf(const QProcess *process)
@@ -246,42 +295,15 @@ int CrvC_SendUsingSSL::exitStatusOf(const QProcess *process)
     return process->exitStatus() == QProcess::NormalExit ? process->exitCode() : -1;
 }
 
-QString CrvC_SendUsingSSL::failureCause(bool lookup, int exitStatus, const QByteArray &errors)
+void CrvC_SendUsingSSL::reportFailure(const CrvC_SendRecorder::Ticket &ticket, const CrvC_SendFailure::Run &run)
 {
-    QString cause;
-    switch (exitStatus) {
-    case NotStarted:
-        return tr("vancurl could not be started");
-    case 0:
-        return tr("the server named no upload address");
-    case 3:
-        cause = tr("the report could not be read");
-        break;
-    case 4:
-        cause = tr("no connection to the server");
-        break;
-    case 5:
-        cause = tr("the server's certificate is not trusted");
-        break;
-    case 6:
-        cause = (lookup ? tr("the server answered HTTP status %1") : tr("the server refused the report (HTTP status %1)"))
-                    .arg(httpStatusIn(errors));
-        break;
-    default:
-        cause = exitStatus < 0 ? tr("vancurl ended abnormally") : tr("the transfer failed");
-        break;
-    }
-    return exitStatus < 0 ? cause : tr("%1 (vancurl exit status %2)").arg(cause).arg(exitStatus);
-}
-
-void CrvC_SendUsingSSL::reportFailure(const CrvC_SendRecorder::Ticket &ticket, const QString &cause, int exitStatus,
-                                      const QByteArray &errors)
-{
-    CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Failed, cause, qMax(-1, exitStatus),
-                              httpStatusIn(errors));
-    if (!ticket || ticket->interactive) {
-        CrvC_UserNotice::warning(tr(FailureText));
-        CrvC_UserNotice::offerEmail(ticket ? ticket->reportFile : QString());
+    CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Failed, CrvC_SendFailure::cause(run),
+                              run.started ? run.exitStatus : -1, httpStatusIn(run.reason));
+    // A retry's failure is in the history and on the status line; only a
+    // send the user started gets the warning and the other method offered.
+    if (ticket->interactive) {
+        CrvC_UserNotice::warning(tr(FailureText), CrvC_SendFailure::details(run, ticket->reportFile));
+        CrvC_UserNotice::offerEmail(ticket->reportFile);
     }
 }
 

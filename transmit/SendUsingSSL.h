@@ -1,14 +1,16 @@
 #pragma once
 
+#include "transmit/SendFailure.h"
+#include "transmit/SendRecorder.h"
+
 #include <QObject>
 #include <QProcess>
 #include <QString>
 #include <QStringList>
 
-#include "transmit/SendRecorder.h"
-
 #include <memory>
 
+class CrvC_ProxyDiscovery;
 class QEventLoopLocker;
 class QIODevice;
 
@@ -16,10 +18,11 @@ class QIODevice;
 // a lookup of the current upload address at the maker's redirect service,
 // then the form upload. Create it with new, call SendFile once and forget it:
 // it deletes itself. Every send is recorded in the send history
-// (CrvC_SendRecorder) from before the lookup to its outcome. A lookup or
-// upload that fails warns the user and offers the e-mail method
-// (CrvC_UserNotice), except when it retried a recorded failure. The
-// application is kept running (QEventLoopLocker) until the upload has ended.
+// (CrvC_SendRecorder) from before the proxy is found to its outcome. A lookup
+// or upload that fails warns the user and offers the e-mail method
+// (CrvC_UserNotice), with the cause beneath the warning (CrvC_SendFailure),
+// unless it was a retry of a recorded failure. The application is kept
+// running (QEventLoopLocker) until the upload has ended.
 class CrvC_SendUsingSSL : public QObject
 {
     Q_OBJECT
@@ -28,9 +31,11 @@ public:
     static const char *const AccessCode;   // the upload form's fixed access code
     static const char *const RedirectPath; // path and query of the redirect service
     static const char *const CaBundle;     // data file with the trusted authorities
+    static const char *const SystemCaBundle; // the system's trust store (Debian's ca-certificates)
     static const char *const FailureText;  // the warning after a failed send
 
-    // Takes the proxy from CrvC_ProxyDiscovery::findProxy().
+    // Finds the proxy with CrvC_ProxyDiscovery when SendFile is called, in
+    // the background; the lookup starts with its answer.
     CrvC_SendUsingSSL();
     // Uses `proxy` ("host:port", empty for none) without any discovery.
     explicit CrvC_SendUsingSSL(const QString &proxy);
@@ -44,9 +49,15 @@ public:
     void SendFile(const QString &file);
 
     QString proxy() const { return m_proxy; }
-    // The lookup's arguments: [--proxy P] --cacert BUNDLE REDIRECT_URL.
+    // The authorities the server's certificate is checked against: the
+    // installation's CaBundle when it exists, else the system's trust store
+    // (the file that SSL_CERT_FILE names, else SystemCaBundle). Empty when
+    // there is none of them: vancurl then uses libcurl's built-in default.
+    // Verification is never switched off.
+    static QString caBundlePath();
+    // The lookup's arguments: [--proxy P] [--cacert BUNDLE] REDIRECT_URL.
     QStringList redirectArguments() const;
-    // The upload's arguments: [--proxy P] --cacert BUNDLE, the four -F fields
+    // The upload's arguments: [--proxy P] [--cacert BUNDLE], the four -F fields
     // (file_loc, domain, regid, access), then `url`.
     QStringList uploadArguments(const QString &url) const;
 
@@ -72,22 +83,18 @@ public Q_SLOTS:
     // failure, then schedules the object's deletion.
     void LaunchSSLProcess();
 
-    // The cause of a failed lookup or upload for the user, from vancurl's
-    // exit status (NotStarted: it could not be run) and its error output.
-    static QString failureCause(bool lookup, int exitStatus, const QByteArray &errors);
-
 private:
-    static constexpr int NotStarted = -2;
-
     void lookupFailedToStart();
     void startUpload(const QString &address);
+    CrvC_SendFailure::Run lookupRun() const;
     static int exitStatusOf(const QProcess *process);
     // Records the failure; a send the user started also gets the warning
     // and the offer of the e-mail method.
-    static void reportFailure(const CrvC_SendRecorder::Ticket &ticket, const QString &cause, int exitStatus,
-                              const QByteArray &errors);
+    static void reportFailure(const CrvC_SendRecorder::Ticket &ticket, const CrvC_SendFailure::Run &run);
 
     QString m_proxy;
+    bool m_proxyKnown = true;
+    CrvC_ProxyDiscovery *m_discovery = nullptr;
     QString m_reportFile;
     QProcess *m_lookupProcess = nullptr;
     bool m_ended = false;

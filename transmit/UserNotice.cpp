@@ -24,12 +24,12 @@ void CrvC_UserNotice::setHandlers(Warning warning, EmailOffer emailOffer)
     emailOfferHandler() = std::move(emailOffer);
 }
 
-void CrvC_UserNotice::warning(const QString &text)
+void CrvC_UserNotice::warning(const QString &text, const QString &details)
 {
     if (warningHandler())
-        warningHandler()(text);
+        warningHandler()(text, details);
     else
-        Port_MsgManData::debugStub("Corvid warning: %s\n", qUtf8Printable(text));
+        Port_MsgManData::debugStub("Corvid warning: %s %s\n", qUtf8Printable(text), qUtf8Printable(details));
 }
 
 void CrvC_UserNotice::offerEmail(const QString &reportFile)

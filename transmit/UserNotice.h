@@ -11,14 +11,16 @@
 class CrvC_UserNotice
 {
 public:
-    using Warning = std::function<void(const QString &text)>;
+    // `details` says what happened beneath the warning itself; may be empty.
+    using Warning = std::function<void(const QString &text, const QString &details)>;
     using EmailOffer = std::function<void(const QString &reportFile)>;
 
     // Replaces both handlers; an empty function restores its default.
     static void setHandlers(Warning warning, EmailOffer emailOffer);
 
-    // A modal warning with the OK button; returns when it is closed.
-    static void warning(const QString &text);
+    // A modal warning with the OK button, `details` beneath `text`; returns
+    // when it is closed.
+    static void warning(const QString &text, const QString &details = QString());
     // The send method dialog for `reportFile` with e-mail preselected, modal.
     static void offerEmail(const QString &reportFile);
 };

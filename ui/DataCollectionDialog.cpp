@@ -3,8 +3,11 @@
 #include "DataCollectionHtmlViewer.h"
 #include "SendToClipDlg.h"
 #include "host/Env.h"
+#include "host/MsgManData.h"
 #include "host/String.h"
 #include "project/ProjectRepositoryValues.h"
+#include "report/PageStore.h"
+#include "report/PageText.h"
 #include "transmit/MakerServer.h"
 #include "transmit/SendRecorder.h"
 
@@ -12,6 +15,7 @@
 #include <QFileInfo>
 #include <QHBoxLayout>
 #include <QInputDialog>
+#include <QLabel>
 #include <QPushButton>
 #include <QTabWidget>
 #include <QVBoxLayout>
@@ -32,6 +36,25 @@ public:
     WaitCursor(const WaitCursor &) = delete;
     WaitCursor &operator=(const WaitCursor &) = delete;
 };
+
+// How much of `page` the Contents tab shows: all of it, or above the limit
+// its beginning up to a line end, so that no tag or entity is split.
+qsizetype shownLength(const QString &page)
+{
+    if (page.size() <= CrvC_DataCollectionDialog::ContentsLimit)
+        return page.size();
+    const qsizetype end = page.lastIndexOf(QLatin1Char('\n'), CrvC_DataCollectionDialog::ContentsLimit);
+    return end <= 0 ? CrvC_DataCollectionDialog::ContentsLimit : end;
+}
+
+QString cutNotice()
+{
+    using Dialog = CrvC_DataCollectionDialog;
+    return QLatin1String("<P><B>")
+           + Dialog::tr("This page is too large to be shown here in full; below is its beginning.")
+           + QLatin1String("</B> <A HREF='") + QLatin1String(Dialog::BrowseContentsUrl) + QLatin1String("'>")
+           + Dialog::tr("Open the whole page in the web browser") + QLatin1String("</A></P><HR>");
+}
 
 } // namespace
 
@@ -62,8 +85,6 @@ CrvC_DataCollectionDialog::CrvC_DataCollectionDialog(QWidget *parent, const char
     connect(m_introductionViewer, &QTextBrowser::anchorClicked, this,
             &CrvC_DataCollectionDialog::onAnchorClicked);
 
-    // A link on the page, and the link to the whole of a cut page, open in
-    // the web browser; the page itself stays in the tab.
     m_contentsViewer = new CrvC_DataCollectionHtmlViewer(this);
     m_contentsViewer->setOpenLinks(false);
     connect(m_contentsViewer, &QTextBrowser::anchorClicked, this,
@@ -97,9 +118,24 @@ CrvC_DataCollectionDialog::CrvC_DataCollectionDialog(QWidget *parent, const char
     m_declineButton->setToolTip(tr("Opt out of sending device usage statistics to Vantor "));
     m_helpButton = new QPushButton(tr("  Help  "), this);
     m_helpButton->setToolTip(tr("Get help for this dialog "));
+    // Sending takes a click, or Space on "Send to Vantor": Enter in a viewer
+    // must not press a default button.
+    for (QPushButton *button : {m_sendButton, m_verifyButton, m_declineButton, m_helpButton}) {
+        button->setAutoDefault(false);
+        button->setDefault(false);
+    }
+
+    // Filled when the dialog is shown, with the settings of that moment.
+    m_destinationLabel = new QLabel(this);
+    m_destinationLabel->setObjectName(QStringLiteral("destinationLabel"));
+    m_destinationLabel->setTextFormat(Qt::PlainText);
+    m_destinationLabel->setWordWrap(true);
+    m_destinationLabel->setContentsMargins(10, 0, 10, 0);
 
     layout->addSpacing(8);
     layout->addWidget(m_tabWidget, 9);
+    layout->addSpacing(8);
+    layout->addWidget(m_destinationLabel);
     layout->addSpacing(8);
     auto *buttons = new QHBoxLayout();
     buttons->addSpacing(10);
@@ -123,7 +159,11 @@ CrvC_DataCollectionDialog::CrvC_DataCollectionDialog(QWidget *parent, const char
     connect(m_helpButton, &QPushButton::clicked, this, &CrvC_DataCollectionDialog::getHelp);
 }
 
-CrvC_DataCollectionDialog::~CrvC_DataCollectionDialog() = default;
+CrvC_DataCollectionDialog::~CrvC_DataCollectionDialog()
+{
+    if (!m_pageHandedOver)
+        m_builder.discardOwnCopy();
+}
 
 CrvC_ReportBuilder::Environment CrvC_DataCollectionDialog::builderEnvironment()
 {
@@ -141,6 +181,7 @@ CrvC_ReportBuilder::Environment CrvC_DataCollectionDialog::builderEnvironment()
         else
             QApplication::restoreOverrideCursor();
     };
+    env.pageFolder = [] { return CrvC_PageStore::newFolder(); };
     return env;
 }
 
@@ -159,39 +200,71 @@ QString CrvC_DataCollectionDialog::reportPath() const
 
 QString CrvC_DataCollectionDialog::contentsText(const QString &page, bool *cut)
 {
+    const qsizetype length = shownLength(page);
     if (cut)
-        *cut = page.size() > ContentsLimit;
-    if (page.size() <= ContentsLimit)
+        *cut = length < page.size();
+    if (length == page.size())
         return page;
-    // Cut at a line end, so that no tag or entity is split, and say so at
-    // the top of the page, where the reader starts.
-    qsizetype end = page.lastIndexOf(QLatin1Char('\n'), ContentsLimit);
-    if (end <= 0)
-        end = ContentsLimit;
-    const QString notice = QLatin1String("<P><B>")
-                           + tr("This page is too large to be shown here in full; below is its beginning.")
-                           + QLatin1String("</B> <A HREF='") + QLatin1String(BrowseContentsUrl)
-                           + QLatin1String("'>") + tr("Open the whole page in the web browser")
-                           + QLatin1String("</A></P><HR>");
-    QString text = page.left(end);
+    // The cut is told at the top of the page, where the reader starts.
+    QString text = page.left(length);
     const qsizetype body = text.indexOf(QLatin1String("<BODY"));
     const qsizetype afterBody = body < 0 ? -1 : text.indexOf(QLatin1Char('>'), body);
-    text.insert(afterBody < 0 ? 0 : afterBody + 1, notice);
+    text.insert(afterBody < 0 ? 0 : afterBody + 1, cutNotice());
     return text;
+}
+
+QString CrvC_DataCollectionDialog::contentsSource(const QString &page, bool *cut)
+{
+    const qsizetype length = shownLength(page);
+    if (cut)
+        *cut = length < page.size();
+    return QLatin1String("<P><B>")
+           + tr("Some of the text of this page would not show in its formatted view. Below is the page as "
+                "it is sent, mark-up included.")
+           + QLatin1String("</B></P>") + (length < page.size() ? cutNotice() : QString())
+           + QLatin1String("<PRE STYLE='white-space: pre-wrap'>") + page.left(length).toHtmlEscaped()
+           + QLatin1String("</PRE>");
+}
+
+QString CrvC_DataCollectionDialog::destinationText(const CrvC_SendDispatcher::Destination &to)
+{
+    const auto shown = [](const QString &value) { return value.isEmpty() ? tr("(none)") : value; };
+    const QString upload = tr("HTTPS upload to %1, with your registration ID %2 and network domain %3")
+                               .arg(shown(to.server), shown(to.registrationId), shown(to.domain));
+    if (to.asks)
+        return tr("You choose how it is sent before it goes: %1; or e-mail to %2").arg(upload, to.mailbox);
+    if (to.method == CrvC_SendDispatcher::Method::Email)
+        return tr("E-mail to %1 with %2").arg(to.mailbox, shown(to.emailTool));
+    return upload;
 }
 
 void CrvC_DataCollectionDialog::showContents()
 {
     WaitCursor wait;
+    const QString page = m_builder.pageText();
+    const QString view = contentsText(page, &m_contentsCut);
     m_contentsViewer->clear();
-    m_contentsViewer->setHtml(contentsText(m_builder.pageText(), &m_contentsCut));
+    m_contentsViewer->setHtml(view);
+    m_contentsAsText = !CrvC_PageText::showsAllText(view, m_contentsViewer->toPlainText());
+    if (m_contentsAsText)
+        m_contentsViewer->setHtml(contentsSource(page, &m_contentsCut));
+}
+
+void CrvC_DataCollectionDialog::showEvent(QShowEvent *event)
+{
+    m_destinationLabel->setText(destinationText(CrvC_SendDispatcher::destination()));
+    Gui::Clip::Dialog::showEvent(event);
 }
 
 void CrvC_DataCollectionDialog::sendData()
 {
-    const QString page = QFileInfo(reportPath()).absoluteFilePath();
-    CrvC_SendRecorder::noteOrigin(page, m_builder.data().projectFileToOpen(), m_designName);
-    CrvC_SendToClipDlg::showSendMethodDialog(this, page);
+    if (!m_builder.written()) {
+        Port_MsgManData::debugStub("Corvid: no report written, nothing sent\n");
+        return;
+    }
+    m_pageHandedOver = true;
+    CrvC_SendRecorder::noteOrigin(m_builder.pagePath(), m_builder.data().projectFileToOpen(), m_designName);
+    CrvC_SendToClipDlg::showSendMethodDialog(this, m_builder.pagePath());
     ProjectRepositoryValues::instance().countSend(m_builder.data().projectFileToOpen(),
                                                   m_builder.projectIteration());
 }
@@ -203,11 +276,17 @@ void CrvC_DataCollectionDialog::verifyContents()
 
 void CrvC_DataCollectionDialog::browseContents()
 {
-    WaitCursor wait;
-    const QString path = reportPath();
-    if (!path.isEmpty() && QFileInfo(path).isFile())
-        Gui::Clip::HelpManager::runWebBrowser(
-            QUrl::fromLocalFile(QFileInfo(path).absoluteFilePath()).toString());
+    const QString path = m_builder.pagePath();
+    if (path.isEmpty() || !QFileInfo(path).isFile())
+        return;
+    bool opened = false;
+    {
+        WaitCursor wait;
+        opened = Gui::Clip::HelpManager::runWebBrowser(QUrl::fromLocalFile(path).toString());
+    }
+    if (!opened)
+        Gui::Clip::MessageBox::warning(this, windowTitle(),
+                                       tr("No web browser could be started to show the whole page."), path);
 }
 
 void CrvC_DataCollectionDialog::decline()
@@ -230,6 +309,4 @@ void CrvC_DataCollectionDialog::onContentsAnchorClicked(const QUrl &url)
 {
     if (url.toString() == QLatin1String(BrowseContentsUrl))
         browseContents();
-    else
-        onAnchorClicked(url);
 }

@@ -2,19 +2,28 @@
 
 #include "host/gui/Dialog.h"
 #include "report/ReportBuilder.h"
+#include "transmit/SendDispatcher.h"
 
 #include <QUrl>
 
 class CrvC_DataCollectionHtmlViewer;
+class QLabel;
 class QPushButton;
 class QTabWidget;
 
 // The review dialog: the user reads what is about to be sent (tabs
 // Introduction, Contents, Help) and sends it or declines. It owns the report
 // builder of its report and supplies the builder's hooks (the design-name
-// prompt, the wait cursor); the Contents tab shows the built page, and a page
-// too large for the viewer only in its beginning, with a link that opens the
-// whole page in the web browser.
+// prompt, the wait cursor, a folder for the report's own copy of its page);
+// the Contents tab shows the built page, and a page too large for the viewer
+// only in its beginning, with a link that opens the whole page in the web
+// browser. Where the view of the page would drop text, the tab shows the
+// page's exact text instead. A line above the buttons says where the report
+// goes and what travels with it.
+//
+// The send step sends the report's own copy of its page, so that a later
+// report cannot change what this one sends; a page that is not sent loses
+// its copy with the dialog. No button is the default: Enter never sends.
 //
 // exec() answers Accepted after "Send to Vantor" (the send step has then
 // already started) and Rejected after "Decline", Escape or closing.
@@ -48,11 +57,17 @@ public:
     void showContents();
     // True when the Contents tab shows only the beginning of the page.
     bool contentsCut() const { return m_contentsCut; }
+    // True when the Contents tab shows the page's text rather than its view.
+    bool contentsAsText() const { return m_contentsAsText; }
 
     // What the Contents tab shows for `page`: the page itself, or, above
     // ContentsLimit, its beginning (cut at a line end) followed by the link
     // to the whole page; `cut` tells which.
     static QString contentsText(const QString &page, bool *cut = nullptr);
+    // The same as the page's exact text, for a page whose view drops text.
+    static QString contentsSource(const QString &page, bool *cut = nullptr);
+    // The line above the buttons for `destination`.
+    static QString destinationText(const CrvC_SendDispatcher::Destination &destination);
 
     QTabWidget *tabWidget() const { return m_tabWidget; }
     CrvC_DataCollectionHtmlViewer *introductionViewer() const { return m_introductionViewer; }
@@ -62,20 +77,27 @@ public:
     QPushButton *verifyButton() const { return m_verifyButton; }
     QPushButton *declineButton() const { return m_declineButton; }
     QPushButton *helpButton() const { return m_helpButton; }
+    QLabel *destinationLabel() const { return m_destinationLabel; }
 
 public Q_SLOTS:
-    // The send step: the send method decision, then the project's send
-    // counter grows by one whatever the outcome.
+    // The send step: the send method decision for the report's own copy of
+    // its page, then the project's send counter grows by one whatever the
+    // outcome. Without a page (none was written) nothing is sent or counted.
     void sendData();
     void verifyContents();
-    // Opens the whole report file in the web browser.
+    // Opens this report's whole page in the web browser.
     void browseContents();
     void decline();
     void getHelp();
     // Opens `url` in the web browser; the page in the tab stays.
     void onAnchorClicked(const QUrl &url);
 
+protected:
+    void showEvent(QShowEvent *event) override;
+
 private:
+    // Only the link to the whole of a cut page is followed: a value of the
+    // page must not open an address or a file.
     void onContentsAnchorClicked(const QUrl &url);
     CrvC_ReportBuilder::Environment builderEnvironment();
 
@@ -89,5 +111,8 @@ private:
     QPushButton *m_verifyButton = nullptr;
     QPushButton *m_declineButton = nullptr;
     QPushButton *m_helpButton = nullptr;
+    QLabel *m_destinationLabel = nullptr;
     bool m_contentsCut = false;
+    bool m_contentsAsText = false;
+    bool m_pageHandedOver = false;
 };

@@ -4,6 +4,8 @@
 #include "host/gui/PropSheetEvent.h"
 #include "transmit/DataCollectionEmail.h"
 
+#include <QLabel>
+
 using Gui::Clip::PropSheetEvent;
 
 CrvC_DataCollectionPropPageImpl::CrvC_DataCollectionPropPageImpl(QWidget *parent, const char *name)
@@ -12,6 +14,13 @@ CrvC_DataCollectionPropPageImpl::CrvC_DataCollectionPropPageImpl(QWidget *parent
     if (name)
         setObjectName(QString::fromLatin1(name));
     setupUi(this);
+    // Added to the form's widgets, right under the box it is about.
+    m_administratorNote = new QLabel(tr("Set for this installation by your administrator"), this);
+    m_administratorNote->setObjectName(QStringLiteral("administratorNote"));
+    m_administratorNote->setWordWrap(true);
+    m_administratorNote->setIndent(20);
+    m_administratorNote->hide();
+    vboxLayout->insertWidget(vboxLayout->indexOf(collectionCheckBox) + 1, m_administratorNote);
     connect(sslRadioButton, &QAbstractButton::toggled, this,
             &CrvC_DataCollectionPropPageImpl::OnSSLButtonStateChanged);
     connect(sentReportsButton, &QAbstractButton::clicked, this, &CrvC_DataCollectionPropPageImpl::showSentReports);
@@ -40,6 +49,7 @@ void CrvC_DataCollectionPropPageImpl::loadPage()
     m_loaded = CrvC_PreferenceValues::load();
     m_pageLoaded = true;
     collectionCheckBox->setChecked(m_loaded.collect);
+    m_administratorNote->setVisible(m_loaded.collectSetByInstallation);
     showSendProgressCheckBox->setChecked(m_loaded.dontShowProgress);
     sslRadioButton->setChecked(m_loaded.useSsl);
     emailRadioButton->setChecked(!m_loaded.useSsl);

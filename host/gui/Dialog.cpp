@@ -92,8 +92,16 @@ void Dialog::showEvent(QShowEvent *event)
 int MessageBox::warning(QWidget *parent, const QString &caption, const QString &text, int buttons,
                         int defaultButton)
 {
+    return warning(parent, caption, text, QString(), buttons, defaultButton);
+}
+
+int MessageBox::warning(QWidget *parent, const QString &caption, const QString &text,
+                        const QString &informativeText, int buttons, int defaultButton)
+{
     if (QGuiApplication::platformName() == QLatin1String("offscreen")) {
         std::fprintf(stderr, "%s: %s\n", qUtf8Printable(caption), qUtf8Printable(text));
+        if (!informativeText.isEmpty())
+            std::fprintf(stderr, "%s\n", qUtf8Printable(informativeText));
         if (defaultButton)
             return defaultButton;
         for (int bit = 1; bit; bit <<= 1) {
@@ -102,8 +110,11 @@ int MessageBox::warning(QWidget *parent, const QString &caption, const QString &
         }
         return QMessageBox::Ok;
     }
-    return QMessageBox::warning(parent, caption, text, QMessageBox::StandardButtons(buttons),
-                                QMessageBox::StandardButton(defaultButton));
+    QMessageBox box(QMessageBox::Warning, caption, text, QMessageBox::StandardButtons(buttons), parent);
+    box.setInformativeText(informativeText);
+    if (defaultButton)
+        box.setDefaultButton(QMessageBox::StandardButton(defaultButton));
+    return box.exec();
 }
 
 namespace {

@@ -63,6 +63,10 @@ public:
     // and `defaultButton` (or the first of `buttons`) is answered.
     static int warning(QWidget *parent, const QString &caption, const QString &text,
                        int buttons = 0x00000400 /* QMessageBox::Ok */, int defaultButton = 0);
+    // The same with `informativeText` beneath `text` (what happened, in detail).
+    static int warning(QWidget *parent, const QString &caption, const QString &text,
+                       const QString &informativeText, int buttons = 0x00000400 /* QMessageBox::Ok */,
+                       int defaultButton = 0);
 };
 
 // Opens addresses and help topics outside the host.

@@ -66,6 +66,7 @@ void PropSheet::showItem(int index)
         return;
     PropItem *entry = item(index);
     QWidget *page = entry->page();
+    const bool firstShow = !page;
     if (!page) {
         QWidget *container = m_pages->widget(index);
         auto *holder = new QWidget(m_pages);
@@ -86,24 +87,36 @@ void PropSheet::showItem(int index)
         const QSignalBlocker blocker(m_list);
         m_list->setCurrentRow(index);
     }
-    PropSheetEvent event(PropSheetEvent::ActivatePage);
+    PropSheetEvent event(firstShow ? PropSheetEvent::ActivatePage : PropSheetEvent::ReactivatePage);
     QCoreApplication::sendEvent(page, &event);
 }
 
-void PropSheet::apply()
+bool PropSheet::apply()
 {
+    for (int index = 0; index < itemCount(); ++index) {
+        if (QWidget *page = item(index)->page()) {
+            PropSheetEvent event(PropSheetEvent::ValidateChanges);
+            event.accept();
+            QCoreApplication::sendEvent(page, &event);
+            if (!event.isAccepted()) {
+                showItem(index);
+                return false;
+            }
+        }
+    }
     for (const auto &item : m_items) {
         if (QWidget *page = item->page()) {
             PropSheetEvent event(PropSheetEvent::ApplyChanges);
             QCoreApplication::sendEvent(page, &event);
         }
     }
+    return true;
 }
 
 void PropSheet::accept()
 {
-    apply();
-    QDialog::accept();
+    if (apply())
+        QDialog::accept();
 }
 
 } // namespace Clip

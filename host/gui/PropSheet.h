@@ -17,8 +17,11 @@ class PropItem;
 
 // The host's preference sheet: a list of items on the left, the page of the
 // selected item on the right, OK, Apply and Cancel below. Pages are created
-// on first display and driven by PropSheetEvent: 1000 when a page is shown,
-// 1004 on Apply and OK (to every page created so far).
+// on first display and driven by PropSheetEvent: 1000 when a page is first
+// shown, 1001 when it is shown again (so a page keeps what the user changed
+// while another page was shown), and on Apply and OK, to every page created
+// so far, 1003 and then 1004. A page that ignores the 1003 event refuses
+// its values: the sheet shows it, stores nothing and stays open.
 class ORBHOSTGUI_EXPORT PropSheet : public QDialog
 {
     Q_OBJECT
@@ -36,8 +39,9 @@ public:
 
     // Shows the page of item `index`, creating it first when needed.
     void showItem(int index);
-    // Sends 1004 to every page created so far.
-    void apply();
+    // Sends 1003 to every page created so far and, when none refuses, 1004;
+    // false when a page refused.
+    bool apply();
 
     void accept() override;
 

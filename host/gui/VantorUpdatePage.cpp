@@ -4,14 +4,16 @@
 #include "PropSheet.h"
 #include "PropSheetEvent.h"
 
+#include "Dialog.h"
+
 #include "host/Settings.h"
 
 #include <QFormLayout>
 #include <QGroupBox>
-#include <QIntValidator>
 #include <QLabel>
 #include <QLineEdit>
 #include <QRadioButton>
+#include <QRegularExpressionValidator>
 #include <QVBoxLayout>
 
 namespace Gui {
@@ -51,7 +53,12 @@ VantorUpdatePage::VantorUpdatePage(QWidget *parent)
     setObjectName(QStringLiteral("VantorUpdatePage"));
     m_host->setObjectName(QStringLiteral("proxyHost"));
     m_port->setObjectName(QStringLiteral("proxyPort"));
-    m_port->setValidator(new QIntValidator(1, 65535, m_port));
+    // 1 to 65535 without leading zeros: a keystroke that leaves that range
+    // is refused (QIntValidator lets five-digit numbers above it through).
+    m_port->setValidator(new QRegularExpressionValidator(
+        QRegularExpression(QStringLiteral("[1-9][0-9]{0,3}|[1-5][0-9]{4}|6[0-4][0-9]{3}|65[0-4][0-9]{2}"
+                                          "|655[0-2][0-9]|6553[0-5]")),
+        m_port));
     m_system->setChecked(true);
 
     auto *group = new QGroupBox(tr("Connections to Vantor's web site"), this);
@@ -121,12 +128,26 @@ void VantorUpdatePage::applyPage()
     else
         settings.setValue(QString::fromLatin1(HostKey), host);
     const QString port = m_port->text().trimmed();
-    int pos = 0;
-    QString checked = port;
-    if (!port.isEmpty() && m_port->validator()->validate(checked, pos) == QValidator::Acceptable)
+    if (!port.isEmpty() && portAcceptable())
         settings.setValue(QString::fromLatin1(PortKey), port);
     else
         settings.remove(QString::fromLatin1(PortKey));
+}
+
+bool VantorUpdatePage::portAcceptable() const
+{
+    QString port = m_port->text().trimmed();
+    int pos = 0;
+    return port.isEmpty() || m_port->validator()->validate(port, pos) == QValidator::Acceptable;
+}
+
+bool VantorUpdatePage::validatePage()
+{
+    if (!m_manual->isChecked() || portAcceptable())
+        return true;
+    MessageBox::warning(this, tr("VantorUpdate"), tr("The proxy port must be a number from 1 to 65535."));
+    m_port->setFocus();
+    return false;
 }
 
 void VantorUpdatePage::customEvent(QEvent *event)
@@ -134,6 +155,9 @@ void VantorUpdatePage::customEvent(QEvent *event)
     switch (int(event->type())) {
     case PropSheetEvent::ActivatePage:
         loadPage();
+        break;
+    case PropSheetEvent::ValidateChanges:
+        event->setAccepted(validatePage());
         break;
     case PropSheetEvent::ApplyChanges:
         applyPage();

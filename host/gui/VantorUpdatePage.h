@@ -18,7 +18,8 @@ class PropSheet;
 //   "ProxyChoice"  0 no proxy, 1 the system's proxy settings, 2 manual
 //   "ProxyHost"    host name of the manual proxy (absent when none was given)
 //   "ProxyPort"    its port (absent when none was given)
-// Loads on PropSheetEvent 1000, stores on 1004.
+// Loads on PropSheetEvent 1000, refuses a port outside 1..65535 on 1003,
+// stores on 1004.
 class ORBHOSTGUI_EXPORT VantorUpdatePage : public QWidget
 {
     Q_OBJECT
@@ -38,6 +39,9 @@ public:
     void loadPage();
     // Stores the page's choice; a manual choice also stores host and port.
     void applyPage();
+    // False, after telling the user, when the manual choice has a port that
+    // is not a number from 1 to 65535.
+    bool validatePage();
 
     QRadioButton *noProxyButton() const { return m_none; }
     QRadioButton *systemProxyButton() const { return m_system; }
@@ -50,6 +54,7 @@ protected:
 
 private:
     void updateEnabled();
+    bool portAcceptable() const;
 
     QRadioButton *m_none;
     QRadioButton *m_system;

@@ -157,7 +157,7 @@ TestServer::Upload TestServer::upload(int index) const
     if (index < 0 || index >= folders.size())
         return upload;
     const QString folder = folders.at(index);
-    const QList<QByteArray> lines = readFile(folder + QLatin1String("/fields.txt")).split('\n');
+    const QList<QByteArray> lines = readFile(folder + QLatin1Char('/') + fieldsFileName()).split('\n');
     for (const QByteArray &line : lines) {
         const int eq = line.indexOf('=');
         if (eq > 0)

@@ -41,7 +41,7 @@ public:
     {
         QByteArray file;              // the stored report, as received
         QString storedAs;             // its file name in the upload's folder
-        QMap<QString, QString> fields; // fields.txt: received, file_loc, domain, regid, access, ...
+        QMap<QString, QString> fields; // @fields.txt: received, file_loc, domain, regid, access, ...
     };
 
     TestServer();
@@ -66,6 +66,8 @@ public:
     // What the receiver wrote so far (the listening line, one line per request).
     QString log();
 
+    // The name of the fields file in each upload's folder.
+    static QString fieldsFileName() { return QStringLiteral("@fields.txt"); }
     // The stored uploads, oldest first.
     QStringList uploadFolders() const;
     Upload upload(int index) const;

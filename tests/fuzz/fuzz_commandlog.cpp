@@ -2,6 +2,7 @@
 #include "FuzzInput.h"
 
 #include "report/CommandLog.h"
+#include "report/SectionBuffer.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t *data, size_t size)
 {
@@ -10,6 +11,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t *data, size_t size)
     CrvC_ReportData report;
     CrvC_CommandLog::readCommandLog(log, report);
     CrvC_CommandLog::checkFuseLog(fuse, report);
-    CrvC_CommandLog::commandLineHistorySection(report);
+    CrvC_SectionBuffer section;
+    CrvC_CommandLog::commandLineHistorySection(report, section);
     return 0;
 }

@@ -79,8 +79,9 @@ void TestVantorUpdatePage::loadAndApply_data()
     QTest::newRow("no proxy; system") << "0|-|-" << "none" << "system" << "" << "" << "1|-|-";
     QTest::newRow("manual; without port drops the old port") << "2|old|80" << "manual" << "manual" << "h" << "" << "2|h|-";
     QTest::newRow("manual; without host") << "2|old|80" << "manual" << "manual" << " " << "80" << "2|-|80";
-    QTest::newRow("unknown choice; port out of range is not stored")
-        << "7|h|-" << "system" << "manual" << "h" << "99999" << "2|h|-";
+    // Refused before anything is stored.
+    QTest::newRow("unknown choice; port out of range refused")
+        << "7|h|-" << "system" << "manual" << "h" << "99999" << "7|h|-";
     QTest::newRow("not a number; system") << "abc|-|-" << "system" << "system" << "" << "" << "1|-|-";
     QTest::newRow("manual; no proxy keeps the manual entry") << "2|h|80" << "manual" << "none" << "x" << "1" << "0|h|80";
 }
@@ -107,8 +108,12 @@ void TestVantorUpdatePage::loadAndApply()
     QFETCH(QString, port);
     page.hostEdit()->setText(host);
     page.portEdit()->setText(port);
-    PropSheetEvent apply(PropSheetEvent::ApplyChanges);
-    QCoreApplication::sendEvent(&page, &apply);
+    PropSheetEvent validate(PropSheetEvent::ValidateChanges);
+    QCoreApplication::sendEvent(&page, &validate);
+    if (validate.isAccepted()) {
+        PropSheetEvent apply(PropSheetEvent::ApplyChanges);
+        QCoreApplication::sendEvent(&page, &apply);
+    }
     QTEST(stored(), "after");
 }
 

@@ -139,7 +139,7 @@ QList<Reader> readers()
         {"netlist-build report", InputFile::CoreReport,
          "<document><scope stringID='LNKGEN_CORE_INSTANCE'>"
          "<item stringID='LNKGEN_CORE_INFO' type='counter' depth='4'/></scope></document>",
-         [](const QString &path) { return CrvC_CoresStatistics().sectionText(path); },
+         [](const QString &path) { return QString::fromUtf8(CrvC_CoresStatistics().sectionText(path)); },
          "document", "coresstatistics"},
         {"help viewer data", InputFile::HelpViewerData,
          "<OrbHelpViewerData><SearchString found='true' count='3'>fifo</SearchString></OrbHelpViewerData>",

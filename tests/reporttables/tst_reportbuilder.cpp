@@ -1,5 +1,6 @@
 #include "common/TestEnvironment.h"
 #include "project/CorvidSettings.h"
+#include "report/PageStore.h"
 #include "report/ReportBuilder.h"
 
 #include <QDir>
@@ -106,7 +107,7 @@ private Q_SLOTS:
         QTest::newRow("caller's name used with its blanks") << "  top  " << true << "other" << 0
                                                             << "untrimmed";
         QTest::newRow("typed name trimmed") << "" << true << "  top  " << 1 << "trimmed";
-        QTest::newRow("cancelled: empty name") << "" << false << "top" << 1 << "nameless";
+        QTest::newRow("cancelled: nothing built") << "" << false << "top" << 1 << "";
     }
 
     void designName()
@@ -123,6 +124,30 @@ private Q_SLOTS:
         builder.createReport(QStringLiteral("top.orb"), given, QString());
         QCOMPARE(m_asked, asked);
         QCOMPARE(builder.data().targetDevice, device);
+        QCOMPARE(builder.written(), !device.isEmpty());
+        QCOMPARE(QFile::exists(builder.reportPath()), !device.isEmpty());
+    }
+
+    // Each build's own copy, in a folder of its own, goes when a later build finds it old.
+    void ownCopies()
+    {
+        CrvC_ReportBuilder::Environment env = environment();
+        QDateTime when = QDateTime::currentDateTime();
+        env.pageFolder = [&when] { return CrvC_PageStore::newFolder(when); };
+        const QString outside = m_dir->filePath(QStringLiteral("outside"));
+        QVERIFY(CorvidTest::writeFile(outside + QLatin1String("/kept"), "x"));
+        QVERIFY(QDir().mkpath(CrvC_PageStore::root()));
+        QVERIFY(QFile::link(outside, CrvC_PageStore::root() + QLatin1String("/link")));
+        QStringList copies;
+        for (int build = 0; build < 2; ++build) {
+            CrvC_ReportBuilder builder(env);
+            builder.createReport(QStringLiteral("top"), QStringLiteral("top"), QString());
+            copies << builder.pagePath();
+            QCOMPARE(QFileInfo(copies.last()).fileName(), QStringLiteral("device_usage_statistics.html"));
+            when = when.addDays(CrvC_PageStore::KeepDays + 1);
+        }
+        QVERIFY(!QFile::exists(copies.at(0)) && QFile::exists(copies.at(1)));
+        QVERIFY(QFile::exists(outside + QLatin1String("/kept")));
     }
 
     void noInputFiles()

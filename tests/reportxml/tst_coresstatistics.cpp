@@ -102,7 +102,7 @@ void tst_CoresStatistics::sectionText()
     QFETCH(QString, expected);
     const QString path = m_dir.filePath(QStringLiteral("design%1_lnkgen.drpt").arg(++m_files));
     QVERIFY(CorvidTest::writeFile(path, xml));
-    const QString text = CorvidTest::cellText(CrvC_CoresStatistics().sectionText(path));
+    const QString text = CorvidTest::cellText(QString::fromUtf8(CrvC_CoresStatistics().sectionText(path)));
     QCOMPARE(text, expected.isNull() ? QString() : QLatin1String("Core Statistics|") + expected);
 }
 

@@ -43,7 +43,8 @@ private Q_SLOTS:
     void init()
     {
         m_env->clearSettings();
-        for (const char *name : {"https_proxy", "HTTPS_PROXY", "http_proxy", "HTTP_PROXY", "all_proxy", "ALL_PROXY"})
+        for (const char *name : {"https_proxy", "HTTPS_PROXY", "http_proxy", "HTTP_PROXY", "all_proxy", "ALL_PROXY",
+                                 "no_proxy", "NO_PROXY", "CORVID_SERVER"})
             qunsetenv(name);
     }
 
@@ -145,6 +146,19 @@ private Q_SLOTS:
         QTest::newRow("http before all") << QStringList{"ALL_PROXY=a:1", "HTTP_PROXY=h:2"} << "h:2";
         QTest::newRow("empty is unset") << QStringList{"https_proxy=", "all_proxy=a:3"} << "a:3";
         QTest::newRow("URL") << QStringList{"https_proxy=http://me:pw@p.example:3128/"} << "p.example:3128";
+        // no_proxy against the maker's server, www.vantor.example:443 unless CORVID_SERVER says otherwise.
+        const QString p = "https_proxy=p:1";
+        QTest::newRow("no_proxy: the host") << QStringList{p, "no_proxy=a.example, WWW.Vantor.Example"} << "DIRECT";
+        QTest::newRow("no_proxy: domain, dot") << QStringList{p, "no_proxy=.vantor.example"} << "DIRECT";
+        QTest::newRow("no_proxy: domain") << QStringList{p, "no_proxy=vantor.example"} << "DIRECT";
+        QTest::newRow("no_proxy: wildcard") << QStringList{p, "NO_PROXY=*"} << "DIRECT";
+        QTest::newRow("no_proxy: port") << QStringList{p, "no_proxy=www.vantor.example:443"} << "DIRECT";
+        QTest::newRow("no_proxy: other port") << QStringList{p, "no_proxy=www.vantor.example:8443"} << "p:1";
+        QTest::newRow("no_proxy: part of a label") << QStringList{p, "no_proxy=antor.example,www"} << "p:1";
+        QTest::newRow("no_proxy: lower case first") << QStringList{p, "no_proxy=a.example", "NO_PROXY=*"} << "p:1";
+        QTest::newRow("no_proxy: IPv6")
+            << QStringList{p, "CORVID_SERVER=https://[::1]:8443", "no_proxy=[::1]:8443"} << "DIRECT";
+        QTest::newRow("no_proxy without a proxy") << QStringList{"no_proxy=*"} << "";
     }
 
     void environment()

@@ -13,6 +13,7 @@
 #include "transmit/UserNotice.h"
 
 #include <QPointer>
+#include <QUrl>
 #include <QtTest>
 
 using namespace CorvidTest;
@@ -23,6 +24,7 @@ class TestSendUsingSSL : public QObject
     std::unique_ptr<Environment> m_env;
     QStringList m_debug;
     QStringList m_warnings;
+    QStringList m_details;
     QStringList m_offers;
     QStringList m_status;
 
@@ -48,8 +50,9 @@ private Q_SLOTS:
     {
         m_env.reset(new Environment);
         Port_MsgManData::setSink([this](const Port_MsgManData::Message &m) { m_debug << QString::fromStdString(m.text); });
-        CrvC_UserNotice::setHandlers([this](const QString &text) { m_warnings << text; },
-                                     [this](const QString &file) { m_offers << file; });
+        CrvC_UserNotice::setHandlers(
+            [this](const QString &text, const QString &details) { m_warnings << text; m_details << details; },
+            [this](const QString &file) { m_offers << file; });
         Port::StatusLine::setDisplay([this](const QString &text) { m_status << text; });
         TestServer::putStageBinFirstInPath();
     }
@@ -58,12 +61,15 @@ private Q_SLOTS:
     {
         m_debug.clear();
         m_warnings.clear();
+        m_details.clear();
         m_offers.clear();
         CrvC_SendRecorder::waitForDone(); // an earlier test's outcome is not this one's
         QCoreApplication::processEvents();
         m_status.clear();
         m_env->clearSettings();
         qunsetenv("CORVID_SERVER");
+        qunsetenv("SSL_CERT_FILE");
+        QVERIFY(m_env->writeDataFile("reports/ca-cert-bundle.crt", "not a bundle\n"));
     }
 
     void cleanupTestCase()
@@ -167,32 +173,54 @@ private Q_SLOTS:
     {
         QTest::addColumn<QStringList>("receiverArguments");
         QTest::addColumn<bool>("stopReceiver");
-        QTest::addColumn<bool>("hideVancurl");
+        QTest::addColumn<QByteArray>("vancurl"); // empty: the staged one; "none": not on PATH; else a script
+        QTest::addColumn<QString>("bundle");     // the test CA: "installation", "system" (SSL_CERT_FILE), "none"
+        QTest::addColumn<QString>("proxy");
         QTest::addColumn<int>("reportSize");
-        QTest::addColumn<bool>("delivered");
-        QTest::addColumn<QString>("status"); // the status line after the send
-        QTest::newRow("delivered") << QStringList() << false << false << 70000 << true
-                                   << "Usage report sent to 127.0.0.1, 68 KB \u2014 Edit > Preferences > Corvid > Sent reports";
-        QTest::newRow("page without an address") << QStringList{"--no-redirect"} << false << false << 100 << false
-                                                 << "Usage report not sent: the server named no upload address";
-        // Retried by corvid-history once the receiver is back.
-        QTest::newRow("receiver stopped") << QStringList() << true << false << 100 << false
-                                          << "Usage report not sent: no connection to the server (vancurl exit status 4)";
-        QTest::newRow("upload refused")
-            << QStringList{"--max-bytes", "2000"} << false << false << 5000 << false
-            << "Usage report not sent: the server refused the report (HTTP status 413) (vancurl exit status 6)";
-        QTest::newRow("vancurl not found") << QStringList() << false << true << 100 << false
-                                           << "Usage report not sent: vancurl could not be started";
+        QTest::addColumn<QString>("cause"); // beneath the warning, %1 the server; empty: delivered
+        const QStringList none;
+        const QString inst = "installation";
+        QTest::newRow("delivered") << none << false << QByteArray() << inst << "" << 70000 << "";
+        QTest::newRow("no bundle installed: the system's store")
+            << none << false << QByteArray() << "system" << "" << 100 << "";
+        QTest::newRow("server not trusted") << none << false << QByteArray() << "none" << "" << 100
+                                            << "The certificate of the server %1 could not be verified.";
+        QTest::newRow("page without an address") << QStringList{"--no-redirect"} << false << QByteArray() << inst
+                                                 << "" << 100 << "The server %1 named no upload address.";
+        // Sent again by corvid-history once the receiver is back.
+        QTest::newRow("receiver stopped") << none << true << QByteArray() << inst << "" << 100
+                                          << "Could not connect to %1.";
+        QTest::newRow("proxy refuses") << none << false << QByteArray() << inst << "127.0.0.1:1" << 100
+                                       << "The proxy 127.0.0.1:1 could not be reached or refused the connection to %1.";
+        QTest::newRow("upload refused") << QStringList{"--max-bytes", "2000"} << false << QByteArray() << inst << ""
+                                        << 5000 << "The server %1 refused the report with HTTP 413.";
+        QTest::newRow("vancurl not found") << none << false << QByteArray("none") << inst << "" << 100
+                                           << "The transfer tool vancurl could not be started: ";
+        // Statuses and reasons a later vancurl may give.
+        QTest::newRow("timed out") << none << false << QByteArray("echo 'vancurl: Operation timed out' >&2; exit 4")
+                                   << inst << "" << 100 << "The connection to %1 timed out.";
+        QTest::newRow("redirect answered") << none << false << QByteArray("echo 'vancurl: HTTP status 302' >&2; exit 8")
+                                           << inst << "" << 100 << "The server %1 answered the address lookup with HTTP 302.";
+        QTest::newRow("time limit") << none << false << QByteArray("echo 'vancurl: took longer' >&2; exit 9") << inst
+                                    << "" << 100 << "The transfer to %1 took longer than its time limit.";
+        QTest::newRow("unknown status") << none << false << QByteArray("echo 'vancurl: odd' >&2; exit 12") << inst
+                                        << "" << 100 << "The transfer to %1 failed (exit status 12): odd";
     }
 
     void sends()
     {
         QFETCH(QStringList, receiverArguments);
         QFETCH(int, reportSize);
-        QFETCH(bool, delivered);
+        QFETCH(QString, bundle);
+        QFETCH(QString, cause);
         TestServer server;
         QVERIFY2(server.start(receiverArguments), qPrintable(server.error()));
-        QVERIFY(m_env->writeDataFile("reports/ca-cert-bundle.crt", readFile(server.caFile())));
+        if (bundle == "installation")
+            QVERIFY(m_env->writeDataFile("reports/ca-cert-bundle.crt", readFile(server.caFile())));
+        else
+            QVERIFY(QFile::remove(m_env->installRoot() + "/data/reports/ca-cert-bundle.crt"));
+        if (bundle == "system")
+            qputenv("SSL_CERT_FILE", QFile::encodeName(server.caFile()));
         qputenv("CORVID_SERVER", server.baseUrl().toUtf8());
         storeRegistration("Jürgen Ä, REG-9");
         QFETCH(bool, stopReceiver);
@@ -205,22 +233,40 @@ private Q_SLOTS:
             report += char((i * 7 + i / 256) & 0xff);
         const QString file = server.scratchDir() + "/my project/device_usage_statistics.html";
         QVERIFY(writeFile(file, report));
-        QFETCH(bool, hideVancurl);
-        send(file, hideVancurl ? QFile::encodeName(server.scratchDir()) : qgetenv("PATH"));
+        QFETCH(QByteArray, vancurl);
+        QFETCH(QString, proxy);
+        QByteArray path = qgetenv("PATH");
+        if (vancurl == "none") {
+            path = QFile::encodeName(server.scratchDir());
+        } else if (!vancurl.isEmpty()) {
+            const QString fake = server.scratchDir() + "/fakebin/vancurl";
+            QVERIFY(writeFile(fake, "#!/bin/sh\n" + vancurl + "\n"));
+            QVERIFY(QFile::setPermissions(fake, QFile::ReadOwner | QFile::WriteOwner | QFile::ExeOwner));
+            path = QFile::encodeName(server.scratchDir() + "/fakebin:") + path;
+        }
+        send(file, path, proxy);
 
-        // The send is recorded with its bytes, and said on the status line.
+        // Recorded with its bytes, and said on the status line.
         QTRY_COMPARE_WITH_TIMEOUT(m_status.size(), 1, 30000);
-        QTEST(m_status.first(), "status");
+        const QString server127 = QUrl(server.baseUrl()).authority();
+        if (cause.isEmpty())
+            QVERIFY2(m_status.first().startsWith("Usage report sent to 127.0.0.1, ")
+                         && m_status.first().endsWith(" KB \u2014 Edit > Preferences > Corvid > Sent reports"),
+                     qPrintable(m_status.first()));
+        else
+            QVERIFY2(m_status.first().startsWith("Usage report not sent: " + cause.arg(server127)),
+                     qPrintable(m_status.first()));
         CrvC_SendHistory history;
         QList<CrvC_SendHistory::Entry> entries;
         QVERIFY2(history.entries(&entries), qPrintable(history.error()));
         QByteArray stored;
         QVERIFY(!entries.isEmpty() && history.page(entries.first().id, &stored));
         QVERIFY(stored == report);
-        QCOMPARE(entries.first().state(), delivered ? CrvC_SendHistory::State::Sent : CrvC_SendHistory::State::Failed);
-        QCOMPARE(entries.first().pending(), !delivered);
+        QCOMPARE(entries.first().state(),
+                 cause.isEmpty() ? CrvC_SendHistory::State::Sent : CrvC_SendHistory::State::Failed);
+        QCOMPARE(entries.first().pending(), !cause.isEmpty());
 
-        if (delivered) {
+        if (cause.isEmpty()) {
             QTRY_VERIFY_WITH_TIMEOUT(m_debug.join("").contains("SSL upload ended with exit status 0"), 30000);
             QVERIFY2(m_warnings.isEmpty() && m_offers.isEmpty(), qPrintable(m_debug.join("")));
             QCOMPARE(server.uploadFolders().size(), 1);
@@ -231,10 +277,15 @@ private Q_SLOTS:
             QCOMPARE(upload.fields.value("regid"), QStringLiteral("Jürgen Ä, REG-9"));
             QCOMPARE(upload.fields.value("access"), QStringLiteral("v9orn"));
             QCOMPARE(entries.first().regid, upload.fields.value("regid"));
+            QVERIFY(m_status.first().contains(reportSize == 70000 ? ", 68 KB" : ", 1 KB"));
         } else {
             QTRY_VERIFY_WITH_TIMEOUT(!m_offers.isEmpty(), 30000);
             QTest::qWait(200);
             QCOMPARE(m_warnings, QStringList{CrvC_SendUsingSSL::FailureText});
+            // The cause, then where the report stays.
+            const QString details = m_details.value(0);
+            QVERIFY2(details.startsWith(cause.arg(QUrl(server.baseUrl()).authority())), qPrintable(details));
+            QVERIFY(details.endsWith("\nThe report was kept at " + file + "."));
             QCOMPARE(m_offers, QStringList{file});
             QCOMPARE(server.uploadFolders().size(), 0);
         }

@@ -3,6 +3,7 @@
 #include "project/CorvidSettings.h"
 #include "transmit/SendDispatcher.h"
 
+#include <QFile>
 #include <QStringList>
 #include <QVariant>
 
@@ -19,11 +20,14 @@ struct SendRecorder
             sends << (method == CrvC_SendDispatcher::Method::Upload ? QStringLiteral("upload")
                                                                     : QLatin1String("email ") + tool);
             files << file;
+            QFile page(file);
+            pages << (page.open(QIODevice::ReadOnly) ? page.readAll() : QByteArray());
         });
     }
     ~SendRecorder() { CrvC_SendDispatcher::setStarter(nullptr); }
     QStringList sends;
     QStringList files;
+    QList<QByteArray> pages; // the files' bytes as the send started
 };
 
 // A stored setting; invalid when the key was never written.

@@ -4,10 +4,12 @@
 #include "host/gui/PropItem.h"
 #include "host/gui/PropSheet.h"
 #include "host/gui/PropSheetEvent.h"
+#include "host/gui/VantorUpdatePage.h"
 #include "ui/DataCollectionPropPageImpl.h"
 #include "transmit/DataCollectionEmail.h"
 #include "ui/PropPageCreator.h"
 
+#include <QLabel>
 #include <QtTest>
 
 using CorvidTest::store;
@@ -65,13 +67,16 @@ private Q_SLOTS:
         QTest::addColumn<bool>("collectShown");
         QTest::addColumn<QVariant>("useSslAfter"); // invalid: not written
         QTest::addColumn<bool>("savedTool");       // the second program is remembered
+        QTest::addColumn<bool>("administrator");   // the note that the installation decides
 
         const QVariant none;
-        QTest::newRow("defaults, unchanged") << none << QByteArray() << false << true << none << false;
+        QTest::newRow("defaults, unchanged") << none << QByteArray() << false << true << none << false << false;
         QTest::newRow("installation switched off")
-            << none << QByteArray("collectusagestatistics=false\n") << false << false << none << false;
-        QTest::newRow("upload to e-mail") << QVariant(true) << QByteArray() << true << true << QVariant(false) << false;
-        QTest::newRow("program remembered") << QVariant(false) << QByteArray() << false << true << QVariant(false) << true;
+            << none << QByteArray("collectusagestatistics=false\n") << false << false << none << false << true;
+        QTest::newRow("upload to e-mail") << QVariant(true) << QByteArray() << true << true << QVariant(false) << false
+                                          << false;
+        QTest::newRow("program remembered") << QVariant(false) << QByteArray() << false << true << QVariant(false)
+                                            << true << false;
     }
 
     void loadAndApply()
@@ -93,6 +98,7 @@ private Q_SLOTS:
         QVERIFY(page);
         const bool ssl = useSsl.isValid() ? useSsl.toBool() : true;
         QCOMPARE(page->collectionCheckBox->isChecked(), collectShown);
+        QTEST(!page->administratorNote()->isHidden(), "administrator");
         QCOMPARE(page->sslRadioButton->isChecked(), ssl);
         QCOMPARE(page->emailRadioButton->isChecked(), !ssl);
         QCOMPARE(page->selectEmailTool->isEnabled(), !ssl);
@@ -141,6 +147,21 @@ private Q_SLOTS:
         page->sslRadioButton->setChecked(true);
         sheet.apply();
         QCOMPARE(stored(CrvC_Settings::UseSSL), QVariant(true));
+    }
+
+    void editKeptAcrossPages()
+    {
+        // Edit, look at another page, come back: OK stores the edit.
+        m_env->clearSettings();
+        Gui::Clip::PropSheet sheet;
+        Gui::Clip::VantorUpdatePage::addTo(&sheet);
+        CrvC_DataCollectionPropPageImpl *page = showCorvidPage(sheet);
+        page->emailRadioButton->setChecked(true);
+        sheet.showItem(0);
+        sheet.showItem(1);
+        QVERIFY(page->emailRadioButton->isChecked());
+        sheet.accept();
+        QCOMPARE(stored(CrvC_Settings::UseSSL), QVariant(false));
     }
 };
 

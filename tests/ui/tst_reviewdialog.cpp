@@ -2,12 +2,15 @@
 #include "DialogTestSupport.h"
 #include "ModalDialogs.h"
 #include "project/ProjectRepositoryValues.h"
+#include "transmit/MakerServer.h"
+#include "transmit/SendUsingSSL.h"
 #include "ui/DataCollectionDialog.h"
 #include "ui/DataCollectionHtmlViewer.h"
 
 #include <QDesktopServices>
 #include <QDir>
 #include <QInputDialog>
+#include <QLabel>
 #include <QPushButton>
 #include <QTabWidget>
 #include <QtTest>
@@ -62,6 +65,7 @@ private Q_SLOTS:
         QTest::newRow("send") << "send" << int(QDialog::Accepted) << "2" << intro;
         QTest::newRow("decline") << "decline" << int(QDialog::Rejected) << QString() << intro;
         QTest::newRow("close") << "close" << int(QDialog::Rejected) << QString() << intro;
+        QTest::newRow("Enter, then close") << "enter" << int(QDialog::Rejected) << QString() << intro;
         // These two only change the tab; the dialog is then declined.
         QTest::newRow("Verify Contents") << "verify" << int(QDialog::Rejected) << QString()
                                          << int(CrvC_DataCollectionDialog::ContentsTab);
@@ -90,10 +94,16 @@ private Q_SLOTS:
             } else if (action == QLatin1String("decline")) {
                 open->declineButton()->click();
             } else {
+                if (action == QLatin1String("enter")) {
+                    for (QWidget *focus : QWidgetList{open->contentsViewer(), open->sendButton()}) {
+                        focus->setFocus();
+                        QTest::keyClick(focus, Qt::Key_Return);
+                    }
+                }
                 open->close();
             }
         });
-        QVERIFY(!dialog.contentsCut());
+        QVERIFY(!dialog.contentsCut() && !dialog.contentsAsText());
         QTEST(dialog.exec(), "result");
         QTEST(tab < 0 ? dialog.tabWidget()->currentIndex() : tab, "tab");
 
@@ -101,7 +111,7 @@ private Q_SLOTS:
         QCOMPARE(sentWhileOpen, sends ? QStringList{QStringLiteral("upload")} : QStringList());
         QCOMPARE(recorder.sends.size(), sends ? 1 : 0);
         if (sends)
-            QCOMPARE(recorder.files.first(), QFileInfo(dialog.reportPath()).absoluteFilePath());
+            QCOMPARE(recorder.pages.first(), CorvidTest::readFile(dialog.reportPath()));
         QTEST(ProjectRepositoryValues::instance().getValue(
                   project, QLatin1String(ProjectRepositoryValues::SendIterationKey)),
               "counter");
@@ -152,7 +162,7 @@ private Q_SLOTS:
         QTest::addColumn<QString>("design");
 
         QTest::newRow("typed with blanks") << "  led  " << "led";
-        QTest::newRow("cancelled") << QString() << QString();
+        QTest::newRow("cancelled: nothing written, sent or counted") << QString() << QString();
     }
 
     void designNamePrompt()
@@ -169,12 +179,83 @@ private Q_SLOTS:
                 prompt->accept();
             }
         });
+        CorvidTest::SendRecorder recorder;
         CrvC_DataCollectionDialog dialog;
-        dialog.createReport(newProject(QStringLiteral("prompt")), QString(), QStringLiteral("Kestrel"));
+        QFile::remove(dialog.reportPath());
+        const QString project = newProject(QLatin1String(QTest::currentDataTag()));
+        dialog.createReport(project, QString(), QStringLiteral("Kestrel"));
+        dialog.sendData();
 
         QVERIFY(!QApplication::overrideCursor());
-        QVERIFY(QFileInfo(dialog.reportPath()).isFile());
+        QCOMPARE(QFileInfo(dialog.reportPath()).isFile(), !design.isEmpty());
         QCOMPARE(dialog.builder().data().targetDevice.isEmpty(), design.isEmpty());
+        QCOMPARE(recorder.sends.size(), design.isEmpty() ? 0 : 1);
+        const QString counter = ProjectRepositoryValues::instance().getValue(
+            project, QLatin1String(ProjectRepositoryValues::SendIterationKey));
+        QCOMPARE(counter.isEmpty(), design.isEmpty());
+    }
+
+    // What the line above the buttons says is what the upload sends.
+    void destination_data()
+    {
+        QTest::addColumn<bool>("useSsl");
+        QTest::addColumn<QVariant>("tool");
+        QTest::addColumn<QString>("start"); // how the line begins
+
+        QTest::newRow("upload") << true << QVariant() << "HTTPS upload to " + CrvC_MakerServer::host() + ",";
+        QTest::newRow("e-mail") << false << QVariant("/usr/bin/mutt")
+            << "E-mail to " + CrvC_SendDispatcher::emailRecipient() + " with /usr/bin/mutt";
+        QTest::newRow("no mail program: asked") << false << QVariant() << "You choose how";
+    }
+
+    void destination()
+    {
+        QFETCH(bool, useSsl);
+        QFETCH(QVariant, tool);
+        QFETCH(QString, start);
+        CrvC_Settings::setValue(CrvC_Settings::UseSSL, useSsl);
+        CrvC_Settings::setValue(CrvC_Settings::DontShowSendToDlg, true);
+        CorvidTest::store(CrvC_Settings::SelectedEmailTool, tool);
+        CrvC_DataCollectionDialog dialog;
+        dialog.show();
+        const QString line = dialog.destinationLabel()->text();
+        QVERIFY2(line.startsWith(start), qPrintable(line));
+        // The identifiers the upload sends beside the page, and only for an upload.
+        const QRegularExpression fields(QStringLiteral("^(domain|regid)=."));
+        const bool upload = !start.startsWith(QLatin1String("E-mail"));
+        for (const QString &field : CrvC_SendUsingSSL(QString()).uploadArguments(QString()).filter(fields))
+            QCOMPARE(line.contains(field.section(QLatin1Char('='), 1)), upload);
+    }
+
+    // Where the view would hide text that is sent, the tab shows the page's exact text.
+    void contents_data()
+    {
+        QTest::addColumn<QString>("file");
+        QTest::addColumn<QByteArray>("content");
+        QTest::addColumn<QStringList>("shown");
+
+        QTest::newRow("usage values") << "top_usage.xml"
+                                      << QByteArray("<DeviceUsageReport><DeviceUsage><group name='G'>"
+                                                    "<item name='count&lt;3&gt;' value='1'/><item name='n' "
+                                                    "value='&lt;!--'/><item name='after' value='7'/>"
+                                                    "</group></DeviceUsage></DeviceUsageReport>")
+                                      << QStringList{"count<3>=1", "n=<!--", "after=7"};
+        QTest::newRow("title in a page") << "par_usage_statistics.html" << QByteArray("<TITLE>kept</TITLE>")
+                                         << QStringList{"<TITLE>kept</TITLE>"};
+    }
+
+    void contents()
+    {
+        QFETCH(QString, file);
+        QFETCH(QByteArray, content);
+        QFETCH(QStringList, shown);
+        QVERIFY(CorvidTest::writeFile(file, content));
+        CrvC_DataCollectionDialog dialog;
+        dialog.createReport(QString(), QStringLiteral("top"), QString());
+        QFile::remove(file);
+        QVERIFY(dialog.contentsAsText());
+        for (const QString &value : shown)
+            QVERIFY2(dialog.contentsViewer()->toPlainText().contains(value), qPrintable(value));
     }
 
     void largeReportInDialog()
@@ -207,8 +288,10 @@ private Q_SLOTS:
         QVERIFY(page.startsWith(shown));
         QCOMPARE(page.at(shown.size()), QLatin1Char('\n'));
 
-        Q_EMIT dialog.contentsViewer()->anchorClicked(QUrl(QLatin1String(CrvC_DataCollectionDialog::BrowseContentsUrl)));
-        QCOMPARE(m_opened, QStringList{QUrl::fromLocalFile(QFileInfo(dialog.reportPath()).absoluteFilePath()).toString()});
+        // Only that link leaves the tab: a link in a value opens nothing.
+        for (const char *link : {"https://x.example/", "file:///etc/passwd", "corvid:browse-contents"})
+            Q_EMIT dialog.contentsViewer()->anchorClicked(QUrl(QLatin1String(link)));
+        QCOMPARE(m_opened, QStringList{QUrl::fromLocalFile(dialog.builder().pagePath()).toString()});
         QVERIFY(!QApplication::overrideCursor());
     }
 

@@ -6,6 +6,7 @@
 #include "ui/SendClipDlgImp.h"
 #include "ui/SendToClipDlg.h"
 #include "ui/SendToClipDlgImp.h"
+#include "transmit/DataCollectionEmail.h"
 
 #include <QDir>
 #include <QtTest>
@@ -23,6 +24,15 @@ class TestSendDialogs : public QObject
 {
     Q_OBJECT
     std::unique_ptr<CorvidTest::Environment> m_env;
+    QByteArray m_path;
+
+    // A mail program on PATH, or none at all; answers the program.
+    QString mailPrograms(bool present)
+    {
+        const QString bin = m_env->home() + QLatin1String("/bin");
+        qputenv("PATH", present ? QFile::encodeName(bin) + ':' + m_path : m_path);
+        return present ? bin + QLatin1String("/thunderbird") : QString();
+    }
 
 private Q_SLOTS:
     void initTestCase()
@@ -30,8 +40,13 @@ private Q_SLOTS:
         m_env.reset(new CorvidTest::Environment);
         QDir().mkpath(m_env->home() + QLatin1String("/work"));
         QVERIFY(QDir::setCurrent(m_env->home() + QLatin1String("/work")));
+        QVERIFY(CorvidTest::writeFile(m_env->home() + QLatin1String("/bin/thunderbird"), "#!/bin/sh\n"));
+        m_path = qgetenv("PATH");
+        if (CrvC_DataCollectionEmail().emailTools().size())
+            QSKIP("this machine has a mail program in a fixed folder");
     }
     void init() { m_env->clearSettings(); }
+    void cleanup() { qputenv("PATH", m_path); }
 
     void methodDialogOpens_data()
     {
@@ -39,15 +54,20 @@ private Q_SLOTS:
         QTest::addColumn<QVariant>("dontShow");
         QTest::addColumn<QVariant>("tool");
         QTest::addColumn<QString>("entry"); // "ask": showSendMethodDialog; "email": ...ForEmail
+        QTest::addColumn<bool>("programs");
         QTest::addColumn<bool>("shown");
         QTest::addColumn<bool>("emailChecked");
         QTest::addColumn<bool>("boxChecked");
 
         const QVariant none, yes(true), no(false);
-        QTest::newRow("nothing stored: no dialog") << none << none << none << "ask" << false << false << false;
-        QTest::newRow("e-mail stored") << no << none << QVariant("mutt") << "ask" << true << true << true;
-        QTest::newRow("automatic, no program") << no << yes << none << "ask" << true << true << true;
-        QTest::newRow("after a failed upload") << none << no << none << "email" << true << true << false;
+        QTest::newRow("nothing stored: no dialog") << none << none << none << "ask" << true << false << false << false;
+        QTest::newRow("e-mail stored") << no << none << QVariant("mutt") << "ask" << true << true << true << true;
+        QTest::newRow("automatic, no program") << no << yes << none << "ask" << true << true << true << true;
+        // After a failure the choice is for this report: the box starts cleared.
+        QTest::newRow("after a failed upload") << none << yes << none << "email" << true << true << true << false;
+        QTest::newRow("e-mail stored, no mail program") << no << none << none << "ask" << false << true << false << true;
+        QTest::newRow("after a failed upload, no mail program")
+            << none << none << none << "email" << false << true << false << false;
     }
 
     void methodDialogOpens()
@@ -56,14 +76,17 @@ private Q_SLOTS:
         QFETCH(QVariant, dontShow);
         QFETCH(QVariant, tool);
         QFETCH(QString, entry);
+        QFETCH(bool, programs);
+        mailPrograms(programs);
         store(CrvC_Settings::UseSSL, useSsl);
         store(CrvC_Settings::DontShowSendToDlg, dontShow);
         store(CrvC_Settings::SelectedEmailTool, tool);
         CorvidTest::SendRecorder recorder;
 
-        bool shown = false, email = false, listEnabled = false, box = false;
+        bool shown = false, email = false, listEnabled = false, box = false, explained = false;
         QPointer<QTimer> poll = CorvidTest::onNextModal<CrvC_SendToClipDlg>([&](CrvC_SendToClipDlg *dialog) {
             shown = true;
+            explained = dialog->noEmailToolNote() && !dialog->imp()->emailRadioButton->isEnabled();
             email = dialog->imp()->emailRadioButton->isChecked();
             listEnabled = dialog->imp()->selectEmailTool->isEnabled();
             box = dialog->imp()->dontShowAgain->isChecked();
@@ -85,34 +108,46 @@ private Q_SLOTS:
         QTEST(email, "emailChecked");
         QCOMPARE(listEnabled, email);
         QTEST(box, "boxChecked");
+        QCOMPARE(explained, !programs);
     }
 
     void methodDialogEnds_data()
     {
         QTest::addColumn<QString>("button");
-        QTest::addColumn<bool>("chooseEmail");
+        QTest::addColumn<bool>("afterFailure"); // the offer after a failed upload, e-mail preselected
+        QTest::addColumn<bool>("programs");
+        QTest::addColumn<bool>("tick");       // "Send Corvid file automatically"
         QTest::addColumn<QVariant>("useSsl"); // stored afterwards
         QTest::addColumn<QVariant>("dontShow");
-        QTest::addColumn<QStringList>("started");
+        QTest::addColumn<bool>("toolStored");
+        QTest::addColumn<QString>("started"); // "email" stands for the e-mail through the program
 
         const QVariant none;
-        QTest::newRow("OK, unchanged") << "ok" << false << none << QVariant(true) << QStringList{"upload"};
-        // No mail program: nothing can start, and nothing is shown.
-        QTest::newRow("OK, e-mail without program") << "ok" << true << QVariant(false) << QVariant(true) << QStringList();
-        QTest::newRow("Cancel") << "cancel" << true << none << none << QStringList();
-        QTest::newRow("closed") << "close" << true << none << none << QStringList();
+        // The program shown differs from the none remembered: it is stored too.
+        QTest::newRow("OK, unchanged") << "ok" << false << true << true << none << QVariant(true) << true << "upload";
+        QTest::newRow("failure offer, OK") << "ok" << true << true << false << none << none << false << "email";
+        QTest::newRow("failure offer, ticked, OK")
+            << "ok" << true << true << true << QVariant(false) << QVariant(true) << true << "email";
+        // No mail program: the upload is the one choice left, for this report.
+        QTest::newRow("failure offer, no mail program, OK")
+            << "ok" << true << false << false << none << none << false << "upload";
+        QTest::newRow("Cancel") << "cancel" << true << true << true << none << none << false << "";
+        QTest::newRow("closed") << "close" << true << true << true << none << none << false << "";
     }
 
     void methodDialogEnds()
     {
         QFETCH(QString, button);
-        QFETCH(bool, chooseEmail);
+        QFETCH(bool, afterFailure);
+        QFETCH(bool, programs);
+        QFETCH(bool, tick);
+        QFETCH(QString, started);
+        const QString tool = mailPrograms(programs);
         CorvidTest::SendRecorder recorder;
         CrvC_SendToClipDlg dialog(nullptr, Report);
-        if (chooseEmail) {
-            dialog.imp()->emailRadioButton->setChecked(true);
-            dialog.imp()->selectEmailTool->clear();
-        }
+        if (afterFailure)
+            dialog.offerAfterFailure();
+        dialog.imp()->dontShowAgain->setChecked(tick);
         CorvidTest::onNextModal<CrvC_SendToClipDlg>([&](CrvC_SendToClipDlg *open) {
             if (button == QLatin1String("ok"))
                 open->imp()->okButton->click();
@@ -124,8 +159,10 @@ private Q_SLOTS:
         QCOMPARE(dialog.exec(), int(button == QLatin1String("ok") ? QDialog::Accepted : QDialog::Rejected));
         QTEST(stored(CrvC_Settings::UseSSL), "useSsl");
         QTEST(stored(CrvC_Settings::DontShowSendToDlg), "dontShow");
-        QVERIFY(!stored(CrvC_Settings::SelectedEmailTool).isValid());
-        QTEST(recorder.sends, "started");
+        QFETCH(bool, toolStored);
+        QCOMPARE(stored(CrvC_Settings::SelectedEmailTool), toolStored ? QVariant(tool) : QVariant());
+        const QString expected = started == QLatin1String("email") ? QLatin1String("email ") + tool : started;
+        QCOMPARE(recorder.sends, expected.isEmpty() ? QStringList() : QStringList{expected});
     }
 
     void countdown_data()
@@ -156,7 +193,7 @@ private Q_SLOTS:
             QCOMPARE(dialog->imp()->progressBar->value(), tick);
         }
         QVERIFY(recorder.sends.isEmpty());
-        const QString report = QFileInfo(dialog->reviewDialog()->reportPath()).absoluteFilePath();
+        const QByteArray page = CorvidTest::readFile(dialog->reviewDialog()->reportPath());
 
         bool reviewed = false;
         CrvC_SendClipDlg *countdown = dialog;
@@ -176,12 +213,54 @@ private Q_SLOTS:
 
         QCOMPARE(reviewed, end == QLatin1String("details") || end == QLatin1String("cancel"));
         QTEST(int(recorder.sends.size()), "sends");
-        if (!recorder.files.isEmpty())
-            QCOMPARE(recorder.files.first(), report);
+        if (!recorder.pages.isEmpty())
+            QCOMPARE(recorder.pages.first(), page);
         QFETCH(bool, boxStored);
         QCOMPARE(stored(CrvC_Settings::DontShowSendProgressDlg), boxStored ? QVariant(true) : QVariant());
         QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
         QVERIFY(dialog.isNull());
+    }
+
+    // A second report started during the first's countdown does not change what the first
+    // sends, even from another working directory; declined, it sends nothing, keeps no copy.
+    void twoCycles_data()
+    {
+        QTest::addColumn<bool>("declineSecond");
+        QTest::newRow("both sent") << false;
+        QTest::newRow("second declined") << true;
+    }
+
+    void twoCycles()
+    {
+        QFETCH(bool, declineSecond);
+        CorvidTest::SendRecorder recorder;
+        QList<QPointer<CrvC_SendClipDlg>> cycles;
+        QList<QByteArray> built;
+        for (const QByteArray &device : {QByteArray("first"), QByteArray("second")}) {
+            CorvidTest::writeFile(QStringLiteral("top_map.ktp"), "Target Device : " + device + '\n');
+            cycles << new CrvC_SendClipDlg(nullptr, QString(), QStringLiteral("top"), QString());
+            cycles.last()->timer()->stop();
+            built << CorvidTest::readFile(cycles.last()->reviewDialog()->reportPath());
+            QVERIFY(built.last().contains(device));
+        }
+        const QString project = QDir::currentPath();
+        const QString secondCopy = cycles.last()->reviewDialog()->builder().pagePath();
+        if (declineSecond) {
+            CorvidTest::onNextModal<CrvC_DataCollectionDialog>([](CrvC_DataCollectionDialog *review) {
+                review->declineButton()->click();
+            });
+            cycles.last()->imp()->detailsButton->click();
+            QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
+        }
+        QVERIFY(QDir::setCurrent(m_env->home()));
+        for (const QPointer<CrvC_SendClipDlg> &cycle : cycles) {
+            for (int tick = 0; cycle && tick < CrvC_SendClipDlg::Steps; ++tick)
+                cycle->OnTimeOut();
+        }
+        QVERIFY(QDir::setCurrent(project));
+        QCOMPARE(recorder.pages, declineSecond ? built.mid(0, 1) : built);
+        QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
+        QCOMPARE(QFileInfo::exists(secondCopy), !declineSecond);
     }
 };
 

@@ -3,8 +3,10 @@
 // at several sizes and times the report build on each, so that the build's
 // growth with its input can be seen. Not a test: it prints figures.
 //
-//   corvid-bench [--scale F] [--steps N] [--keep DIR]
+//   corvid-bench [--scale F] [--steps N] [--usage F] [--keep DIR]
 //
+// --usage F scales the usage XML alone (0.25: a 16 MB usage XML beside a
+// scale-1 command log and core report), for projects of another shape.
 // Scale 1 is the reference project: 200,000 command-log lines, a usage XML of
 // about 63 MB, 20,000 core instances, 20,000 help entries. Step k of N builds
 // the project at k/N of the scale.
@@ -45,10 +47,10 @@ struct Sizes
     int macroLines;
 };
 
-Sizes sizesFor(double scale)
+Sizes sizesFor(double scale, double usageScale)
 {
-    return {int(200000 * scale), int(800000 * scale), int(20000 * scale), int(20000 * scale),
-            int(50000 * scale)};
+    return {int(200000 * scale), int(800000 * scale * usageScale), int(20000 * scale),
+            int(20000 * scale), int(50000 * scale)};
 }
 
 // Writes a file in chunks so that generating 50 MB needs little memory.
@@ -277,6 +279,7 @@ int main(int argc, char **argv)
     QApplication app(argc, argv);
     double scale = 1.0;
     int steps = 4;
+    double usageScale = 1.0;
     QString keep;
     const QStringList args = app.arguments();
     for (int i = 1; i < args.size(); ++i) {
@@ -284,10 +287,12 @@ int main(int argc, char **argv)
             scale = args.at(++i).toDouble();
         else if (args.at(i) == QLatin1String("--steps") && i + 1 < args.size())
             steps = qMax(1, args.at(++i).toInt());
+        else if (args.at(i) == QLatin1String("--usage") && i + 1 < args.size())
+            usageScale = args.at(++i).toDouble();
         else if (args.at(i) == QLatin1String("--keep") && i + 1 < args.size())
             keep = args.at(++i);
         else {
-            std::fprintf(stderr, "usage: corvid-bench [--scale F] [--steps N] [--keep DIR]\n");
+            std::fprintf(stderr, "usage: corvid-bench [--scale F] [--steps N] [--usage F] [--keep DIR]\n");
             return 1;
         }
     }
@@ -300,7 +305,7 @@ int main(int argc, char **argv)
                 "xmllint ms", "peak MB", "dialog ms");
     long buildsPeakKiB = 0, runPeakKiB = 0;
     for (int step = 1; step <= steps; ++step) {
-        const Sizes sizes = sizesFor(scale * step / steps);
+        const Sizes sizes = sizesFor(scale * step / steps, usageScale);
         const QString dir = root + QLatin1String("/step") + QString::number(step);
         QDir().mkpath(dir);
         qint64 bytes = 0;

@@ -22,10 +22,11 @@
 
 #include <QApplication>
 #include <QDir>
+#include <QEventLoop>
 #include <QFileInfo>
+#include <QLabel>
 #include <QPixmap>
 #include <QProcess>
-#include <QEventLoop>
 #include <QTabWidget>
 #include <QTemporaryDir>
 #include <QTimer>
@@ -115,6 +116,7 @@ int main(int argc, char **argv)
     qputenv("HOME", QFile::encodeName(temp.path()));
     qputenv("XDG_CONFIG_HOME", QFile::encodeName(temp.path() + QLatin1String("/.config")));
     qputenv("XDG_DATA_HOME", QFile::encodeName(temp.path() + QLatin1String("/.local/share")));
+    qputenv("XDG_CACHE_HOME", QFile::encodeName(temp.path() + QLatin1String("/.cache")));
     qputenv("APPDATA", QFile::encodeName(temp.path() + QLatin1String("/appdata")));
     if (qEnvironmentVariableIsEmpty("QT_QPA_PLATFORM"))
         qputenv("QT_QPA_PLATFORM", "offscreen");
@@ -155,6 +157,12 @@ int main(int argc, char **argv)
         CrvC_DataCollectionDialog review;
         review.createReport(projectFile, QStringLiteral("ledctrl"), family);
         review.resize(760, 680);
+        // The destination line as it is shown, but with a domain of the
+        // documentation's rather than this machine's.
+        review.show();
+        CrvC_SendDispatcher::Destination destination = CrvC_SendDispatcher::destination();
+        destination.domain = QStringLiteral("example.com");
+        review.destinationLabel()->setText(CrvC_DataCollectionDialog::destinationText(destination));
         const char *const names[] = {"review-introduction", "review-contents", "review-help"};
         for (int tab = 0; tab < 3; ++tab) {
             review.tabWidget()->setCurrentIndex(tab);

@@ -7,6 +7,7 @@
 
 #include <sys/stat.h>
 
+#include <chrono>
 #include <cstdio>
 #include <cstring>
 #include <string>
@@ -22,7 +23,17 @@ enum ExitStatus {
     TlsError = 5,        // certificate or TLS handshake
     HttpError = 6,       // the server answered with a status of 400 or more
     TransferError = 7,   // anything else (including a failed write of the answer)
+    RedirectError = 8,   // the server answered with a redirection (3xx), not followed
+    TimeLimitError = 9,  // the whole transfer took longer than its time limit
 };
+
+// The whole transfer ends within BaseSeconds plus one second per BytesPerSecond
+// of the files it uploads, however slowly the server answers.
+const long BaseSeconds = 120;
+const long long BytesPerSecond = 100000;
+
+// Only this field may name a file ("@FILE"); every other value is text.
+const char fileField[] = "file_loc";
 
 const char usage[] =
     "Usage: vancurl [--proxy HOST:PORT] [--cacert FILE] [-F NAME=VALUE]... URL\n"
@@ -36,26 +47,35 @@ const char usage[] =
     "                     https_proxy, all_proxy, no_proxy, ...) are ignored.\n"
     "  --cacert FILE      Check the server's certificate against the certificate\n"
     "                     authorities in FILE (PEM) instead of the system's.\n"
-    "  -F NAME=VALUE      A form field. A VALUE starting with \"@\" names a file whose\n"
-    "                     content is sent as a file upload (its base name as the\n"
-    "                     file name). May be given any number of times.\n"
+    "  -F NAME=VALUE      A form field; VALUE is sent as it is, as text, whatever\n"
+    "                     its first character (\"@\" and \"<\" included). May be\n"
+    "                     given any number of times.\n"
+    "  -F file_loc=@FILE  The one field that names a file: the content of FILE is\n"
+    "                     sent as a file upload (its base name as the file name).\n"
+    "                     Without the \"@\", file_loc is text like any other field.\n"
     "  --version          Show the versions of vancurl and of its libcurl.\n"
     "  -h, --help         Show this text.\n"
     "\n"
     "Options may come in any order; URL (http:// or https://) comes last.\n"
     "TLS certificates and host names are always verified. Redirections are not\n"
-    "followed. The tool gives up when no connection is made within 30 s and when\n"
-    "the transfer stalls (less than 1 byte/s) for 60 s.\n"
+    "followed: an answer with a 3xx status is a failure. The tool gives up when no\n"
+    "connection is made within 30 s, when the transfer stalls (less than 1 byte/s)\n"
+    "for 60 s, and when the whole transfer takes longer than 120 s plus 1 s for\n"
+    "every 100 KB (100000 bytes) of the file uploaded.\n"
     "\n"
     "Exit status:\n"
-    "  0  the transfer completed with an HTTP status below 400\n"
+    "  0  the transfer completed with an HTTP status below 300\n"
     "  2  usage error\n"
-    "  3  a file named by -F NAME=@FILE cannot be read\n"
-    "  4  connection failure (name lookup, proxy, refused, time-out)\n"
+    "  3  the file named by -F file_loc=@FILE cannot be read\n"
+    "  4  connection failure (name lookup, proxy, refused, no connection within\n"
+    "     30 s, transfer stalled for 60 s)\n"
     "  5  TLS failure (certificate not trusted, handshake failed, CA file unusable)\n"
     "  6  the server answered with an HTTP status of 400 or more\n"
     "  7  other transfer failure\n"
-    "On failure a one-line reason goes to standard error.\n";
+    "  8  the server answered with a redirection (HTTP status 300 to 399)\n"
+    "  9  the whole transfer took longer than its time limit\n"
+    "On failure a one-line reason goes to standard error and nothing to standard\n"
+    "output.\n";
 
 int fail(int status, const std::string &reason)
 {
@@ -75,6 +95,8 @@ struct Transfer
     CURL *curl = nullptr;
     std::string errorBody; // the start of an error answer, for the reason line
     bool writeFailed = false;
+    std::chrono::steady_clock::time_point deadline;
+    bool timedOut = false;
 };
 
 size_t writeBody(char *data, size_t size, size_t count, void *user)
@@ -83,9 +105,9 @@ size_t writeBody(char *data, size_t size, size_t count, void *user)
     const size_t bytes = size * count;
     long status = 0;
     curl_easy_getinfo(transfer->curl, CURLINFO_RESPONSE_CODE, &status);
-    if (status >= 400) {
-        // Keep error pages off standard output: callers treat what is there
-        // as the answer.
+    if (status >= 300) {
+        // Keep error and redirection pages off standard output: callers treat
+        // what is there as the answer.
         if (transfer->errorBody.size() < 200)
             transfer->errorBody.append(data, bytes < 200 ? bytes : 200);
         return bytes;
@@ -97,16 +119,28 @@ size_t writeBody(char *data, size_t size, size_t count, void *user)
     return bytes;
 }
 
-bool readableFile(const std::string &path)
+// Ends the transfer once its deadline has passed; libcurl calls it at least
+// once a second, also while nothing arrives.
+int checkDeadline(void *user, curl_off_t, curl_off_t, curl_off_t, curl_off_t)
+{
+    auto *transfer = static_cast<Transfer *>(user);
+    if (std::chrono::steady_clock::now() < transfer->deadline)
+        return 0;
+    transfer->timedOut = true;
+    return 1;
+}
+
+// The size of a readable regular file, or -1.
+long long readableFileSize(const std::string &path)
 {
     struct stat info;
     if (::stat(path.c_str(), &info) != 0 || !S_ISREG(info.st_mode))
-        return false;
+        return -1;
     std::FILE *file = std::fopen(path.c_str(), "rb");
     if (!file)
-        return false;
+        return -1;
     std::fclose(file);
-    return true;
+    return static_cast<long long>(info.st_size);
 }
 
 int classify(CURLcode code)
@@ -180,7 +214,7 @@ int main(int argc, char **argv)
                 Field field;
                 field.name = value.substr(0, eq);
                 field.value = value.substr(eq + 1);
-                if (!field.value.empty() && field.value[0] == '@') {
+                if (field.name == fileField && !field.value.empty() && field.value[0] == '@') {
                     field.isFile = true;
                     field.value.erase(0, 1);
                 }
@@ -196,9 +230,16 @@ int main(int argc, char **argv)
         return fail(UsageError, "no URL given (see --help)");
     if (url.compare(0, 7, "http://") != 0 && url.compare(0, 8, "https://") != 0)
         return fail(UsageError, "the URL must start with http:// or https://");
-    for (const Field &field : fields)
-        if (field.isFile && !readableFile(field.value))
+    long long uploadBytes = 0;
+    for (const Field &field : fields) {
+        if (!field.isFile)
+            continue;
+        const long long size = readableFileSize(field.value);
+        if (size < 0)
             return fail(UploadFileError, "cannot read the file \"" + field.value + "\" of field " + field.name);
+        uploadBytes += size;
+    }
+    const long long limitSeconds = BaseSeconds + uploadBytes / BytesPerSecond;
     if (haveProxy && proxy.empty())
         return fail(UsageError, "--proxy needs a proxy (HOST:PORT)");
 
@@ -209,6 +250,7 @@ int main(int argc, char **argv)
     if (!transfer.curl)
         return fail(TransferError, "cannot initialise libcurl");
     CURL *curl = transfer.curl;
+    transfer.deadline = std::chrono::steady_clock::now() + std::chrono::seconds(limitSeconds);
     char errorText[CURL_ERROR_SIZE] = {0};
 
     curl_easy_setopt(curl, CURLOPT_URL, url.c_str());
@@ -229,6 +271,9 @@ int main(int argc, char **argv)
     curl_easy_setopt(curl, CURLOPT_LOW_SPEED_TIME, 60L);
     curl_easy_setopt(curl, CURLOPT_WRITEFUNCTION, writeBody);
     curl_easy_setopt(curl, CURLOPT_WRITEDATA, &transfer);
+    curl_easy_setopt(curl, CURLOPT_XFERINFOFUNCTION, checkDeadline);
+    curl_easy_setopt(curl, CURLOPT_XFERINFODATA, &transfer);
+    curl_easy_setopt(curl, CURLOPT_NOPROGRESS, 0L);
 
     curl_mime *form = nullptr;
     if (!fields.empty()) {
@@ -250,6 +295,9 @@ int main(int argc, char **argv)
     std::fflush(stdout);
     const bool writeFailed = transfer.writeFailed || std::ferror(stdout);
     const std::string errorBody = oneLine(transfer.errorBody);
+    char *location = nullptr;
+    curl_easy_getinfo(curl, CURLINFO_REDIRECT_URL, &location);
+    const std::string redirectTarget = location ? oneLine(location) : std::string();
     curl_mime_free(form);
     curl_easy_cleanup(curl);
     curl_global_cleanup();
@@ -259,6 +307,13 @@ int main(int argc, char **argv)
     if (status >= 400)
         return fail(HttpError, "HTTP status " + std::to_string(status) + " from " + url
                                    + (errorBody.empty() ? std::string() : ": " + errorBody));
+    if (status >= 300)
+        return fail(RedirectError, "HTTP status " + std::to_string(status) + " from " + url
+                                       + ", a redirection, which is not followed"
+                                       + (redirectTarget.empty() ? "" : " (to " + redirectTarget + ")"));
+    if (transfer.timedOut)
+        return fail(TimeLimitError, "the transfer took longer than its limit of " + std::to_string(limitSeconds)
+                                        + " s (" + url + ")");
     if (code != CURLE_OK)
         return fail(classify(code), std::string(errorText[0] ? errorText : curl_easy_strerror(code))
                                         + " (" + url + ")");
