@@ -83,7 +83,7 @@ void recordSends(const QByteArray &page, const QString &projectFile)
         {CrvC_SendHistory::Method::Email, 4000, CrvC_SendHistory::State::Handed, "usage-statistics@vantor.example",
          "/usr/bin/thunderbird"},
         {CrvC_SendHistory::Method::Upload, 1500, CrvC_SendHistory::State::Failed, "https://www.vantor.example",
-         "no connection to the server (vancurl exit status 4)"},
+         "Could not connect to www.vantor.example."},
         {CrvC_SendHistory::Method::Upload, 2, CrvC_SendHistory::State::Sent,
          "https://upload.vantor.example/cgi-bin/corvid/upload", "Thank you: report 1187 received."},
     };
