@@ -402,10 +402,26 @@ bool CrvC_SendHistory::prune(QSqlQuery &query)
 
 qint64 CrvC_SendHistory::addEntry(const Entry &entry, const QByteArray &page, qint64 *attemptId)
 {
-    QByteArray stored = qCompress(page);
+    QByteArray stored = page.size() <= m_limits.maxBytes ? qCompress(page) : QByteArray();
     if (stored.size() > m_limits.maxBytes)
         stored.clear(); // recorded, but too large to keep
-    const QByteArray sha = QCryptographicHash::hash(page, QCryptographicHash::Sha256).toHex();
+    return insert(entry, page.size(), QCryptographicHash::hash(page, QCryptographicHash::Sha256).toHex(), stored,
+                  attemptId);
+}
+
+qint64 CrvC_SendHistory::addEntry(const Entry &entry, const QString &path, qint64 *attemptId)
+{
+    QFile file(path);
+    if (!file.open(QIODevice::ReadOnly) || file.size() <= m_limits.maxBytes)
+        return addEntry(entry, file.readAll(), attemptId);
+    QCryptographicHash sha(QCryptographicHash::Sha256);
+    sha.addData(&file);
+    return insert(entry, file.size(), sha.result().toHex(), QByteArray(), attemptId);
+}
+
+qint64 CrvC_SendHistory::insert(const Entry &entry, qint64 bytes, const QByteArray &sha, const QByteArray &stored,
+                                qint64 *attemptId)
+{
     qint64 id = 0;
     const qint64 now = msecs(entry.time.isValid() ? entry.time : QDateTime::currentDateTimeUtc());
     const bool done = run(true, [&](QSqlQuery &query) {
@@ -413,8 +429,8 @@ qint64 CrvC_SendHistory::addEntry(const Entry &entry, const QByteArray &page, qi
                      QStringLiteral("INSERT INTO entries(time, project, design, method, destination, domain, "
                                     "regid, bytes, sha256, stored) VALUES(?, ?, ?, ?, ?, ?, ?, ?, ?, ?)"),
                      {now, text(entry.project), text(entry.design), methodName(entry.method),
-                      text(entry.destination), text(entry.domain), text(entry.regid), qint64(page.size()), QString::fromLatin1(sha),
-                      qint64(stored.size())}))
+                      text(entry.destination), text(entry.domain), text(entry.regid), bytes,
+                      QString::fromLatin1(sha), qint64(stored.size())}))
             return false;
         id = query.lastInsertId().toLongLong();
         if (!stored.isEmpty()

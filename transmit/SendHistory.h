@@ -19,7 +19,8 @@ class QSqlQuery;
 // size and SHA-256, and its page (stored compressed). Each try to send it is
 // an attempt; the first is made with the entry, retries add more. Retention
 // keeps the newest MaxEntries entries within MaxBytes of stored pages; a page
-// that alone exceeds MaxBytes is recorded without its bytes.
+// that alone exceeds MaxBytes (as it is or compressed) is recorded without
+// its bytes.
 //
 // A file that is not a readable history (not SQLite, damaged, written by a
 // newer version) is reported through error() and left untouched, except by
@@ -114,6 +115,10 @@ public:
     // in bytes and sha256. Returns the entry's id and the attempt's in
     // `attemptId`; 0 on failure.
     qint64 addEntry(const Entry &entry, const QByteArray &page, qint64 *attemptId);
+    // The same for the page in the file `path`. A file larger than the
+    // history keeps is hashed as it is read, never held in memory whole,
+    // and recorded without its bytes.
+    qint64 addEntry(const Entry &entry, const QString &path, qint64 *attemptId);
     // A further try of entry `id`; returns the attempt's id, 0 on failure.
     qint64 addAttempt(qint64 id, bool automatic);
     bool finishAttempt(qint64 attemptId, State state, const QString &detail, int exitStatus = -1,
@@ -138,6 +143,8 @@ private:
     bool run(bool write, const std::function<bool(QSqlQuery &)> &work);
     bool readEntries(QSqlQuery &query, qint64 onlyId, QList<Entry> *result);
     bool prune(QSqlQuery &query);
+    qint64 insert(const Entry &entry, qint64 bytes, const QByteArray &sha, const QByteArray &stored,
+                  qint64 *attemptId);
     bool fail(const QString &what, const QString &why);
     void vacuum();
     void close();

@@ -5,7 +5,6 @@
 
 #include <QCoreApplication>
 #include <QEventLoopLocker>
-#include <QFile>
 #include <QFileInfo>
 #include <QList>
 #include <QPointer>
@@ -84,9 +83,7 @@ CrvC_SendRecorder::Ticket CrvC_SendRecorder::begin(Method method, const QString 
     }
     run(
         [ticket, entry](CrvC_SendHistory &history) {
-            QFile file(ticket->reportFile);
-            const QByteArray page = file.open(QIODevice::ReadOnly) ? file.readAll() : QByteArray();
-            ticket->entryId = history.addEntry(entry, page, &ticket->attemptId);
+            ticket->entryId = history.addEntry(entry, ticket->reportFile, &ticket->attemptId);
             if (!ticket->entryId)
                 logFailure(history);
         },

@@ -177,9 +177,12 @@ void CrvC_SendHistoryDialog::onSelectionChanged()
     auto text = std::make_shared<QString>();
     CrvC_SendRecorder::run(
         [id, text](CrvC_SendHistory &history) {
+            // Enough of the page to fill the viewer and to tell whether it
+            // is cut: a character takes at most four bytes.
             QByteArray page;
+            const int shown = 4 * (CrvC_DataCollectionDialog::ContentsLimit + 1);
             *text = history.page(id, &page)
-                        ? CrvC_DataCollectionDialog::contentsText(QString::fromUtf8(page))
+                        ? CrvC_DataCollectionDialog::contentsText(QString::fromUtf8(page.left(shown)))
                         : QLatin1String("<P>") + history.error().toHtmlEscaped() + QLatin1String("</P>");
         },
         this,

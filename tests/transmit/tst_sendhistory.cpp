@@ -32,15 +32,17 @@ class TestSendHistory : public QObject
     }
 
     // An entry whose attempts all ended in `last` (the earlier ones failed).
+    // (From a file when `file` is given.)
     static qint64 add(CrvC_SendHistory &history, Method method, const QDateTime &time, int tries, State last,
-                      const QByteArray &page = "<HTML>Ä</HTML>\n")
+                      const QByteArray &page = "<HTML>Ä</HTML>\n", const QString &file = QString())
     {
         CrvC_SendHistory::Entry entry;
         entry.time = time;
         entry.method = method;
         entry.destination = method == Method::Upload ? "https://h.example/upload" : "usage@v.example";
         qint64 attempt = 0;
-        const qint64 id = history.addEntry(entry, page, &attempt);
+        const qint64 id = file.isEmpty() || !writeFile(file, page) ? history.addEntry(entry, page, &attempt)
+                                                                   : history.addEntry(entry, file, &attempt);
         for (int i = 1; i <= tries && id; ++i) {
             if (last != State::Sending || i < tries)
                 history.finishAttempt(attempt, i < tries ? State::Failed : last,
@@ -96,7 +98,8 @@ private Q_SLOTS:
         QList<QByteArray> pages;
         for (int i = 0; i < added; ++i) {
             pages << randomPage(pageSize);
-            QVERIFY2(add(history, Method::Upload, QDateTime::currentDateTimeUtc(), 1, State::Sent, pages.last()),
+            QVERIFY2(add(history, Method::Upload, QDateTime::currentDateTimeUtc(), 1, State::Sent, pages.last(),
+                         m_env->home() + "/page.html"),
                      qPrintable(history.error()));
         }
         QList<CrvC_SendHistory::Entry> entries;
@@ -111,6 +114,7 @@ private Q_SLOTS:
         QCOMPARE(history.page(added, &page), entries.first().pageKept);
         QCOMPARE(page, entries.first().pageKept ? pages.last() : QByteArray());
         QCOMPARE(entries.first().bytes, qint64(pageSize));
+        QCOMPARE(entries.first().sha256, QCryptographicHash::hash(pages.last(), QCryptographicHash::Sha256).toHex());
     }
 
     void pending_data()
