@@ -14,8 +14,9 @@
 // the project file: "<dir>/<name>.orbrepo" for "<dir>/<name>.orb" (a project
 // file without the ".orb" suffix gets ".orbrepo" appended to its whole name).
 // Every write is one transaction of its own, so several processes may write
-// the same repository at once; a writer that finds the file locked waits
-// and retries for a few seconds before it gives up.
+// the same repository at once. An operation that finds the file locked by
+// another process waits for it up to two seconds, then fails (StatusFailed):
+// a failure to read is never an absent value (StatusNotFound).
 //
 // Status: every operation answers StatusOk (1) on success. Success of an
 // open means status 1 together with a non-null object; anything else is a
@@ -47,7 +48,8 @@ enum Status {
     StatusFailed = 0,   // the store could not be read or written
     StatusOk = 1,
     StatusNotFound = 2, // no such project file, repository, section, sub-section or key
-    StatusDenied = 3    // the mode does not allow the operation
+    StatusDenied = 3,   // the mode does not allow the operation
+    StatusConflict = 4  // the stored value is not the one expected (replaceValue)
 };
 
 // A section or sub-section of a project repository.
@@ -73,6 +75,13 @@ public:
     virtual int getValue(const Port::StringBase &key, Port::StringBase &value) = 0;
     // Stores `value` under `key`, replacing what was there.
     virtual int setValue(const Port::StringBase &key, const Port::StringBase &value) = 0;
+    // Stores `value` under `key` only if the key holds `expected` (with a
+    // null `expected`: only if the key has no value), in one transaction, so
+    // that what another process stored in between is never overwritten
+    // unseen. StatusConflict, with nothing stored, when the key held
+    // something else.
+    virtual int replaceValue(const Port::StringBase &key, const Port::StringBase *expected,
+                             const Port::StringBase &value) = 0;
 };
 
 // The repository object.

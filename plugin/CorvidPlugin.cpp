@@ -15,6 +15,7 @@
 #include "host/gui/Dialog.h"
 
 #include <QCoreApplication>
+#include <QEventLoopLocker>
 #include <QMessageBox>
 
 using Gui::Clip::String;
@@ -37,18 +38,27 @@ void installHandlers()
     CrvC_CollectionCycle::Dialogs dialogs;
     dialogs.sendAtOnce = [](const QString &projectFile, const QString &designName,
                             const QString &targetFamily) {
-        CrvC_DataCollectionDialog review(nullptr);
-        review.createReport(projectFile, designName, targetFamily);
-        // Sends nothing when no page was written (design-name prompt
-        // cancelled, page not writable).
-        review.sendData();
+        auto *review = new CrvC_DataCollectionDialog(nullptr);
+        if (!review->startReport(projectFile, designName, targetFamily)) {
+            delete review; // design-name prompt cancelled
+            return;
+        }
+        // The host stays up until the page is written and its send has
+        // started (the upload then keeps it up itself).
+        auto *pending = new QEventLoopLocker;
+        QObject::connect(review, &CrvC_DataCollectionDialog::reportFinished, review, [review, pending] {
+            // Sends nothing when no page was written.
+            review->sendData();
+            review->deleteLater();
+            delete pending;
+        });
     };
     dialogs.countDown = [](const QString &projectFile, const QString &designName,
                            const QString &targetFamily) {
         auto *countdown = new CrvC_SendClipDlg(nullptr, projectFile, designName, targetFamily);
-        // No page, no countdown: nothing is shown or sent.
-        if (!countdown->reviewDialog()->builder().written()) {
-            Port_MsgManData::debugStub("Corvid: no report written, nothing sent\n");
+        // No build, no countdown: nothing is shown or sent.
+        if (!countdown->reportStarted()) {
+            Port_MsgManData::debugStub("Corvid: no report built, nothing sent\n");
             delete countdown;
             return;
         }

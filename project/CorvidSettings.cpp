@@ -43,10 +43,12 @@ void CrvC_Settings::readInstallSettings(QString &timestamp, bool &collect, bool 
     }
     if (path.isEmpty())
         return;
-    QFile file;
-    if (Port::InputFile::open(path, Port::InputFile::InstallSettings, file)
-        != Port::InputFile::Status::Opened)
+    Port::InputFile file;
+    if (file.open(path, Port::InputFile::InstallSettings) != Port::InputFile::Status::Opened)
         return;
+    QString fileStamp = timestamp;
+    bool fileCollect = collect;
+    bool fileSetsCollect = false;
     QTextStream in(&file);
     in.setEncoding(QStringConverter::Utf8);
     QString line;
@@ -54,12 +56,23 @@ void CrvC_Settings::readInstallSettings(QString &timestamp, bool &collect, bool 
         const QStringList parts = line.split(QLatin1Char('='));
         if (parts.size() < 2)
             continue;
-        if (parts.at(0) == QLatin1String("collectusagestatistics")) {
-            collect = parts.at(1) == QLatin1String("true");
-            if (collectFound)
-                *collectFound = true;
-        } else if (parts.at(0) == QLatin1String("timestamp"))
-            timestamp = parts.at(1);
+        // An administrator's "CollectUsageStatistics = false" must not be
+        // lost to a capital or a blank: keys are trimmed and compared without
+        // regard to case, and so is the stamp. The switch itself stays on
+        // only for the exact value "true", so a doubtful value turns it off.
+        const QString key = parts.at(0).trimmed();
+        if (key.compare(QLatin1String("collectusagestatistics"), Qt::CaseInsensitive) == 0) {
+            fileCollect = parts.at(1) == QLatin1String("true");
+            fileSetsCollect = true;
+        } else if (key.compare(QLatin1String("timestamp"), Qt::CaseInsensitive) == 0) {
+            fileStamp = parts.at(1).trimmed();
+        }
+    }
+    if (!file.refused()) {
+        timestamp = fileStamp;
+        collect = fileCollect;
+        if (collectFound && fileSetsCollect)
+            *collectFound = true;
     }
 }
 
@@ -135,12 +148,13 @@ QString CrvC_Settings::newIdentifier()
     return Port::Identifier::newIdentifier();
 }
 
-QString CrvC_Settings::randomId()
+QString CrvC_Settings::randomId(bool keep)
 {
     QString id = value(RandomID, QString()).toString();
     if (id.isEmpty()) {
         id = newIdentifier();
-        setValue(RandomID, id);
+        if (keep)
+            setValue(RandomID, id);
     }
     return id;
 }

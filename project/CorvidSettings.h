@@ -43,9 +43,9 @@ public:
     static bool dontShowSendToDlg(bool defaultValue = false);
     static QString selectedEmailTool();
 
-    // The user's random identifier; made, stored and returned when the stored
-    // one is missing or empty.
-    static QString randomId();
+    // The user's random identifier; made and returned when the stored one is
+    // missing or empty, and then stored unless `keep` is false (a preview).
+    static QString randomId(bool keep = true);
 
     static void setValue(const char *key, const QVariant &value);
     static QVariant value(const char *key, const QVariant &defaultValue);

@@ -28,36 +28,44 @@ const int ReadWriteCreate = 43;
 const int ReadOnly = 1;
 
 // Opens the repository of `projectFile`, its section and sub-section, hands
-// the sub-section to `access`, and releases everything again: the
-// sub-section through its section, then the repository object is closed.
+// the sub-section to `access` (which answers a status), and releases
+// everything again: the sub-section through its section, then the repository
+// object is closed. Answers the status of the step that failed, or the one
+// `access` answered.
 template<typename Access>
-void withSubSection(const QString &projectFile, const char *section, const char *subSection,
-                    int subSectionMode, Access access)
+int withSubSection(const QString &projectFile, const char *section, const char *subSection,
+                   int sectionMode, int subSectionMode, Access access)
 {
     CitP::Factory::LoadLibraryFactory(RepositoryLibrary);
     Prjrep::AutoRelease<CitI::IInterface> object(
         CitP::Factory::CreateInstance(Prjrep::IRepository::objectId()));
     if (!object)
-        return;
+        return Prjrep::StatusFailed;
     auto *repository =
         static_cast<Prjrep::IRepository *>(object->GetInterface(Prjrep::IRepository::iid()));
     if (!repository)
-        return;
+        return Prjrep::StatusFailed;
     CitI::IInterface *sectionObject = nullptr;
-    const int status = repository->openSection(String::convert(projectFile), section,
-                                               ReadWriteCreate, &sectionObject);
-    auto *regSection = status == 1 && sectionObject
+    int status = repository->openSection(String::convert(projectFile), section, sectionMode,
+                                         &sectionObject);
+    auto *regSection = status == Prjrep::StatusOk && sectionObject
                            ? static_cast<Prjrep::IRegSection *>(
                                  sectionObject->GetInterface(Prjrep::IRegSection::iid()))
                            : nullptr;
     if (regSection) {
         Prjrep::IRegSection *sub = nullptr;
-        if (regSection->openSubSection(subSection, subSectionMode, &sub) == 1 && sub) {
-            access(*sub);
+        status = regSection->openSubSection(subSection, subSectionMode, &sub);
+        if (status == Prjrep::StatusOk && sub) {
+            status = access(*sub);
             regSection->releaseSubSection(sub);
+        } else if (status == Prjrep::StatusOk) {
+            status = Prjrep::StatusFailed;
         }
+    } else if (status == Prjrep::StatusOk) {
+        status = Prjrep::StatusFailed;
     }
     repository->close();
+    return status;
 }
 
 bool fileExists(const QString &projectFile)
@@ -76,32 +84,65 @@ bool parseCounter(const QString &text, qlonglong *number)
 
 ProjectRepositoryValues &ProjectRepositoryValues::instance()
 {
-    static ProjectRepositoryValues values;
+    static ProjectRepositoryValues values(true);
     return values;
+}
+
+const ProjectRepositoryValues &ProjectRepositoryValues::readOnly()
+{
+    static const ProjectRepositoryValues values(false);
+    return values;
+}
+
+ProjectRepositoryValues::Lookup ProjectRepositoryValues::lookup(const QString &projectFile,
+                                                                const QString &key,
+                                                                QString *value) const
+{
+    value->clear();
+    if (projectFile.isEmpty())
+        return Lookup::Absent;
+    const int mode = m_writes ? ReadWriteCreate : ReadOnly;
+    const int status = withSubSection(projectFile, CorvidSection, CorvidSubSection, mode, mode,
+                                      [&](Prjrep::IRegSection &sub) {
+                                          Port::StringBase text;
+                                          const int found = sub.getValue(String::convert(key), text);
+                                          *value = String::convert(text);
+                                          return found;
+                                      });
+    if (status == Prjrep::StatusOk)
+        return Lookup::Found;
+    value->clear();
+    return status == Prjrep::StatusNotFound ? Lookup::Absent : Lookup::Failed;
+}
+
+int ProjectRepositoryValues::replace(const QString &projectFile, const QString &key, bool found,
+                                     const QString &expected, const QString &value) const
+{
+    if (!m_writes || projectFile.isEmpty())
+        return Prjrep::StatusDenied;
+    return withSubSection(projectFile, CorvidSection, CorvidSubSection, ReadWriteCreate,
+                          ReadWriteCreate, [&](Prjrep::IRegSection &sub) {
+                              const Port::StringBase old = String::convert(expected);
+                              return sub.replaceValue(String::convert(key), found ? &old : nullptr,
+                                                      String::convert(value));
+                          });
 }
 
 QString ProjectRepositoryValues::getValue(const QString &projectFile, const QString &key) const
 {
     QString value;
-    if (projectFile.isEmpty())
-        return value;
-    withSubSection(projectFile, CorvidSection, CorvidSubSection, ReadWriteCreate,
-                   [&](Prjrep::IRegSection &sub) {
-                       Port::StringBase text;
-                       sub.getValue(String::convert(key), text);
-                       value = String::convert(text);
-                   });
+    lookup(projectFile, key, &value);
     return value;
 }
 
 void ProjectRepositoryValues::setValue(const QString &projectFile, const QString &key,
                                        const QString &value) const
 {
-    if (projectFile.isEmpty())
+    if (!m_writes || projectFile.isEmpty())
         return;
-    withSubSection(projectFile, CorvidSection, CorvidSubSection, ReadWriteCreate,
+    withSubSection(projectFile, CorvidSection, CorvidSubSection, ReadWriteCreate, ReadWriteCreate,
                    [&](Prjrep::IRegSection &sub) {
-                       sub.setValue(String::convert(key), String::convert(value));
+                       return sub.setValue(String::convert(key), String::convert(value));
                    });
 }
 
@@ -115,11 +156,14 @@ QString ProjectRepositoryValues::projectAgeInDays(const QString &projectFile,
 {
     QString stamp = QLatin1String(Uninitialized);
     if (!projectFile.isEmpty()) {
-        withSubSection(projectFile, ConsoleSection, ConsoleSubSection, ReadOnly,
+        withSubSection(projectFile, ConsoleSection, ConsoleSubSection,
+                       m_writes ? ReadWriteCreate : ReadOnly, ReadOnly,
                        [&](Prjrep::IRegSection &sub) {
                            Port::StringBase text;
-                           if (sub.getValue(CreationKey, text) == 1)
+                           const int status = sub.getValue(CreationKey, text);
+                           if (status == Prjrep::StatusOk)
                                stamp = String::convert(text);
+                           return status;
                        });
     }
     if (stamp == QLatin1String(Uninitialized))
@@ -135,18 +179,31 @@ QString ProjectRepositoryValues::projectIdentifier(const QString &projectFile,
 {
     if (!fileExists(projectFile))
         return fresh;
-    const QString stored = getValue(projectFile, QLatin1String(ProjectIdKey));
+    const QString key = QLatin1String(ProjectIdKey);
+    QString stored;
+    const Lookup found = lookup(projectFile, key, &stored);
+    if (found == Lookup::Failed)
+        return QString();
     if (!stored.isEmpty())
         return stored;
-    setValue(projectFile, QLatin1String(ProjectIdKey), fresh);
-    return fresh;
+    if (!m_writes)
+        return fresh;
+    // Stored only where there is still none: two reports made at once agree.
+    const int status = replace(projectFile, key, found == Lookup::Found, stored, fresh);
+    if (status == Prjrep::StatusOk)
+        return fresh;
+    if (status == Prjrep::StatusConflict && lookup(projectFile, key, &stored) == Lookup::Found)
+        return stored;
+    return QString();
 }
 
 QString ProjectRepositoryValues::sendIteration(const QString &projectFile) const
 {
     qlonglong number = 1;
     if (fileExists(projectFile)) {
-        const QString stored = getValue(projectFile, QLatin1String(SendIterationKey));
+        QString stored;
+        if (lookup(projectFile, QLatin1String(SendIterationKey), &stored) == Lookup::Failed)
+            return QString();
         if (!stored.isEmpty() && !parseCounter(stored, &number))
             number = 1;
     }
@@ -156,15 +213,27 @@ QString ProjectRepositoryValues::sendIteration(const QString &projectFile) const
 void ProjectRepositoryValues::countSend(const QString &projectFile,
                                         const QString &shownIteration) const
 {
-    qlonglong number = 0;
-    if (!fileExists(projectFile) || !parseCounter(shownIteration, &number)
-        || number == std::numeric_limits<qlonglong>::max())
+    qlonglong shown = 0;
+    if (!m_writes || !fileExists(projectFile) || !parseCounter(shownIteration, &shown))
         return;
-    // A stored counter that does not parse was shown as 1; it is left as it
-    // is rather than overwritten with 2.
-    const QString stored = getValue(projectFile, QLatin1String(SendIterationKey));
-    qlonglong storedNumber = 0;
-    if (!stored.isEmpty() && !parseCounter(stored, &storedNumber))
-        return;
-    setValue(projectFile, QLatin1String(SendIterationKey), QString::number(number + 1));
+    const QString key = QLatin1String(SendIterationKey);
+    // Read, then store only if nobody stored another value in between;
+    // otherwise count again from what was stored.
+    for (int attempt = 0; attempt < 8; ++attempt) {
+        QString stored;
+        const Lookup found = lookup(projectFile, key, &stored);
+        if (found == Lookup::Failed)
+            return;
+        // A stored counter that does not parse was shown as 1; it is left as
+        // it is rather than overwritten with 2.
+        qlonglong storedNumber = 0;
+        if (!stored.isEmpty() && !parseCounter(stored, &storedNumber))
+            return;
+        const qlonglong larger = qMax(shown, storedNumber);
+        if (larger == std::numeric_limits<qlonglong>::max())
+            return;
+        if (replace(projectFile, key, found == Lookup::Found, stored, QString::number(larger + 1))
+            != Prjrep::StatusConflict)
+            return;
+    }
 }

@@ -121,16 +121,19 @@ QString CrvC_CommandLog::anonymized(const QString &line, const QString &design)
 
 bool CrvC_CommandLog::readCommandLog(const QString &path, CrvC_ReportData &data)
 {
-    QFile file;
-    if (Port::InputFile::open(path, Port::InputFile::CommandLog, file)
-        != Port::InputFile::Status::Opened)
+    Port::InputFile file;
+    if (file.open(path, Port::InputFile::CommandLog) != Port::InputFile::Status::Opened)
         return false;
 
     const Anonymizer anonymize(QFileInfo(path).baseName());
     QTextStream in(&file);
+    QStringList history;
     QString line;
     while (in.readLineInto(&line))
-        data.commandHistory.append(anonymize(line));
+        history.append(anonymize(line));
+    if (file.refused())
+        return false;
+    data.commandHistory += history;
     return true;
 }
 

@@ -4,11 +4,12 @@
 #include "project/ProjectRepositoryValues.h"
 
 QString CrvC_ProjectStatistics::projectStatisticsSection(const QString &projectFile,
-                                                        const QDate &today)
+                                                        const QDate &today,
+                                                        const ProjectRepositoryValues &values)
 {
     ProjectDataManager::PairList rows;
     ProjectDataManager::collectProjectProperties(rows);
-    return sectionText(rows, ProjectRepositoryValues::instance().projectAgeInDays(projectFile, today));
+    return sectionText(rows, values.projectAgeInDays(projectFile, today));
 }
 
 QString CrvC_ProjectStatistics::sectionText(const ProjectDataManager::PairList &rows,

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "project/ProjectDataManager.h"
+#include "project/ProjectRepositoryValues.h"
 
 #include <QDate>
 #include <QString>
@@ -11,8 +12,10 @@ class CrvC_ProjectStatistics
 {
 public:
     // The table for the host's current project and the age of `projectFile`
-    // on `today`.
-    static QString projectStatisticsSection(const QString &projectFile, const QDate &today);
+    // on `today`, read through `values`.
+    static QString projectStatisticsSection(const QString &projectFile, const QDate &today,
+                                            const ProjectRepositoryValues &values
+                                            = ProjectRepositoryValues::instance());
 
     // The table for the given facts, followed by the age row ("Project
     // duration(days)") with `age` (empty when unknown): two cells to a row.

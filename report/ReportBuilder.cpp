@@ -32,6 +32,7 @@
 #include <exception>
 #include <memory>
 #include <new>
+#include <optional>
 #include <system_error>
 #include <thread>
 #include <vector>
@@ -270,10 +271,14 @@ CrvC_ReportBuilder::Environment CrvC_ReportBuilder::withDefaults(Environment env
         environment.now = [] { return QDateTime::currentDateTime(); };
     if (!environment.newIdentifier)
         environment.newIdentifier = &Port::Identifier::newIdentifier;
-    if (!environment.randomId)
-        environment.randomId = &CrvC_Settings::randomId;
+    if (!environment.randomId) {
+        const bool keep = !environment.preview;
+        environment.randomId = [keep] { return CrvC_Settings::randomId(keep); };
+    }
     return environment;
 }
+
+CrvC_ReportBuilder::CrvC_ReportBuilder() : CrvC_ReportBuilder(Environment()) {}
 
 CrvC_ReportBuilder::CrvC_ReportBuilder(Environment environment)
     : m_env(withDefaults(std::move(environment)))
@@ -310,7 +315,7 @@ QString CrvC_ReportBuilder::projectFilePath(const QString &name)
 
 QString CrvC_ReportBuilder::projectIteration()
 {
-    return CrvC_VersionSection::projectIteration(m_data);
+    return CrvC_VersionSection::projectIteration(m_data, CrvC_VersionSection::repository(m_env));
 }
 
 void CrvC_ReportBuilder::createReport(const QString &projectFileArg, const QString &designName,
@@ -321,6 +326,17 @@ void CrvC_ReportBuilder::createReport(const QString &projectFileArg, const QStri
 }
 
 void CrvC_ReportBuilder::buildReport(const QString &projectFileArg, QString designName)
+{
+    // Busy from the end of the design-name prompt to the end of the build.
+    std::optional<BusyCursor> busy;
+    m_afterPrompt = [this, &busy] { busy.emplace(m_env.setBusy); };
+    const bool prepared = prepare(projectFileArg, std::move(designName));
+    m_afterPrompt = nullptr;
+    if (prepared)
+        write();
+}
+
+bool CrvC_ReportBuilder::prepare(const QString &projectFileArg, QString designName)
 {
     m_data.projectFile = projectFileArg.endsWith(QLatin1String(".orb"), Qt::CaseInsensitive)
                              ? projectFileArg
@@ -334,25 +350,53 @@ void CrvC_ReportBuilder::buildReport(const QString &projectFileArg, QString desi
     m_ownFolder.clear();
     m_page.clear();
     m_pageCut = false;
+    m_paths.clear();
     if (designName.isEmpty() && m_env.askDesignName) {
         QString entered;
         // Cancelled: the user wants no report of this design.
         if (!m_env.askDesignName(entered))
-            return;
+            return false;
         designName = entered.trimmed();
     }
+    m_designName = designName;
+    if (m_afterPrompt)
+        m_afterPrompt();
 
-    BusyCursor busy(m_env.setBusy);
-    QStringList paths{m_data.reportPath};
+    m_paths << m_data.reportPath;
     if (m_env.pageFolder) {
         m_ownFolder = m_env.pageFolder();
         if (m_ownFolder.isEmpty())
-            return; // no copy of its own, nothing the send step could stand by
-        paths << m_ownFolder + QLatin1Char('/') + QLatin1String(ReportFileName);
+            return false; // no copy of its own, nothing the send step could stand by
+        m_paths << m_ownFolder + QLatin1Char('/') + QLatin1String(ReportFileName);
     }
+
     try {
-        PageWriter page(paths, m_page, m_pageCut);
-        assemble(designName, page);
+        m_directory = projectDirectory();
+        m_heading = QLatin1String("<H3>Device Usage Page (") + QLatin1String(ReportFileName)
+                    + QLatin1String(")</H3>");
+        for (const char *text : HeadingTexts)
+            m_heading += QCoreApplication::translate(HeadingContext, text);
+        // The map report is read only as far as its target lines (a few lines
+        // at most), which the version section needs for the host's label.
+        CrvC_SynthesisReport::readTargetInfo(inProject(QStringLiteral("_map.ktp"), true), m_data);
+        m_versionSection = CrvC_VersionSection::versionSection(m_data, m_env);
+        m_runStatistics = CrvC_RunStatistics::runStatisticsSection(m_data.projectFileToOpen());
+        m_projectStatistics = CrvC_ProjectStatistics::projectStatisticsSection(
+            m_data.projectFileToOpen(), m_env.now().date(), CrvC_VersionSection::repository(m_env));
+    } catch (const std::bad_alloc &) {
+        // As when the page runs out of memory: nothing written, no copy.
+        m_pageCut = true;
+        discardOwnCopy();
+        return false;
+    }
+    return true;
+}
+
+void CrvC_ReportBuilder::write()
+{
+    try {
+        PageWriter page(m_paths, m_page, m_pageCut);
+        assemble(page);
         m_written = page.commit();
     } catch (const std::bad_alloc &) {
         // The unfinished page is dropped; the previous file stays.
@@ -360,10 +404,19 @@ void CrvC_ReportBuilder::buildReport(const QString &projectFileArg, QString desi
         m_pageCut = true;
     }
     if (m_written)
-        m_pagePath = paths.last();
+        m_pagePath = m_paths.last();
     else
         discardOwnCopy();
+    m_versionSection.clear();
+    m_runStatistics.clear();
+    m_projectStatistics.clear();
     releaseFreedMemory();
+}
+
+QString CrvC_ReportBuilder::inProject(const QString &name, bool designNamed) const
+{
+    const QString file = designNamed ? m_designName + name : name;
+    return m_directory.isEmpty() ? file : m_directory + QLatin1Char('/') + file;
 }
 
 void CrvC_ReportBuilder::discardOwnCopy()
@@ -376,18 +429,13 @@ void CrvC_ReportBuilder::discardOwnCopy()
     m_ownFolder.clear();
 }
 
-void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
+void CrvC_ReportBuilder::assemble(PageWriter &page)
 {
-    const QString directory = projectDirectory();
-    const auto inProject = [&directory](const QString &name) {
-        return directory.isEmpty() ? name : directory + QLatin1Char('/') + name;
-    };
-    const QString mapReport = inProject(designName + QLatin1String("_map.ktp"));
-    const QString synthesisReport = inProject(designName + QLatin1String(".snx"));
-    const QString usageXml = inProject(designName + QLatin1String("_usage.xml"));
-    const QString commandLog = inProject(designName + QLatin1String(".cmd_log"));
+    const QString synthesisReport = inProject(QStringLiteral(".snx"), true);
+    const QString usageXml = inProject(QStringLiteral("_usage.xml"), true);
+    const QString commandLog = inProject(QStringLiteral(".cmd_log"), true);
     const QString fuseLog = inProject(QStringLiteral("fuse.log"));
-    const QString coresReport = inProject(designName + QLatin1String("_lnkgen.drpt"));
+    const QString coresReport = inProject(QStringLiteral("_lnkgen.drpt"), true);
     const QString parPage = inProject(QStringLiteral("par_usage_statistics.html"));
     const QString osimPage = inProject(QStringLiteral("osim/osim_usage_statistics.html"));
 
@@ -417,22 +465,11 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
         [&] { osim += QStringView(CrvC_RunStatistics::osimUsageSection(osimPage)); },
     });
 
-    const QString fileName = QString::fromLatin1(ReportFileName);
     page(QStringLiteral("<HTML><HEAD><TITLE>Device Usage Statistics Report</TITLE></HEAD>"));
     page(QStringLiteral("<BODY TEXT='#000000' BGCOLOR='#FFFFFF' LINK='#0000EE' "
                         "VLINK='#551A8B' ALINK='#FF0000'>"));
-    QString heading = QLatin1String("<H3>Device Usage Page (") + fileName + QLatin1String(")</H3>");
-    for (const char *text : HeadingTexts)
-        heading += QCoreApplication::translate(HeadingContext, text);
-    page(heading);
-
-    // The host, the repository and the settings are asked on this thread,
-    // while the readers work; then it reads along with them.
-    CrvC_SynthesisReport::readTargetInfo(mapReport, m_data);
-    page(CrvC_VersionSection::versionSection(m_data, m_env));
-    const QString runStatistics = CrvC_RunStatistics::runStatisticsSection(m_data.projectFileToOpen());
-    const QString projectStatistics = CrvC_ProjectStatistics::projectStatisticsSection(
-        m_data.projectFileToOpen(), m_env.now().date());
+    page(m_heading);
+    page(m_versionSection);
     readers.finish();
 
     m_data.macroStatistics.swap(macros.macroStatistics);
@@ -454,9 +491,9 @@ void CrvC_ReportBuilder::assemble(const QString &designName, PageWriter &page)
 
     if (!history.isEmpty())
         page.section(history);
-    page(runStatistics);
+    page(m_runStatistics);
     page.section(help);
-    page(projectStatistics);
+    page(m_projectStatistics);
     page.section(cores);
     page.section(par);
     page.section(osim);

@@ -4,6 +4,7 @@
 
 #include <QDateTime>
 #include <QString>
+#include <QStringList>
 
 #include <functional>
 
@@ -14,10 +15,12 @@
 // design name, the busy cursor) goes through the environment hooks, which
 // the review dialog supplies.
 //
-// The file readers run side by side, on the calling thread and a worker
-// thread or two, each on builder data of its own; whatever needs the host's
-// project manager, the repository or the settings stays on the calling
-// thread. The page goes to the file
+// A build has two halves. prepare() runs on the host's GUI thread: it asks
+// the design-name question and everything that needs the host's project
+// manager, the repository or the settings. write() may then run on any
+// thread: it reads the design tools' files, side by side on that thread and
+// a worker thread or two, each reader on builder data of its own, and writes
+// the page; it asks the host nothing. The page goes to the file
 // line by line as it is assembled, so a large project never has the whole
 // page in memory: the builder keeps only its beginning, for the review.
 class CrvC_ReportBuilder
@@ -48,16 +51,22 @@ public:
         // the send step sends, CrvC_PageStore); empty when none could be made.
         // Unset: the build keeps no copy, the page at reportPath is its page.
         std::function<QString()> pageFolder;
+        // A preview: what is stored is read, nothing is stored. The project
+        // repository is opened read-only (ProjectRepositoryValues::readOnly)
+        // and identifiers that do not exist yet are made for the page only.
+        bool preview = false;
     };
 
     // `environment` with the defaults for its unset clock and identifier
     // hooks: the local clock, Port::Identifier::newIdentifier and
-    // CrvC_Settings::randomId. The one place these defaults are chosen.
+    // CrvC_Settings::randomId (which stores what it makes unless `preview`).
+    // The one place these defaults are chosen.
     static Environment withDefaults(Environment environment);
 
     // reportPath := projectFilePath(ReportFileName), made absolute now: a
     // later change of the working directory does not move the page.
-    explicit CrvC_ReportBuilder(Environment environment = Environment());
+    CrvC_ReportBuilder();
+    explicit CrvC_ReportBuilder(Environment environment);
 
     // targetFamily := targetFamily, then buildReport.
     void createReport(const QString &projectFileArg, const QString &designName,
@@ -72,6 +81,16 @@ public:
     // anything is read or written.
     void buildReport(const QString &projectFileArg, QString designName);
 
+    // The first half of buildReport, on the GUI thread: the project file, the
+    // design-name prompt, the folder of the build's own copy, and the
+    // sections that ask the host, the repository and the settings. False
+    // when there is nothing to build (prompt cancelled, no folder for the
+    // copy); write() must then not be called.
+    bool prepare(const QString &projectFileArg, QString designName);
+    // The second half, on any thread, once after prepare(): reads the files,
+    // writes the page. Touches nothing but this builder and its files.
+    void write();
+
     // What the Contents tab shows: the page, or its first PageTextLimit
     // code units when pageCut().
     QString pageText() const { return m_page; }
@@ -79,6 +98,8 @@ public:
     // True when the last build wrote the file (and its own copy).
     bool written() const { return m_written; }
     QString reportPath() const { return m_data.reportPath; }
+    // The design of the last build, as given or entered at the prompt.
+    QString designName() const { return m_designName; }
     // The file that holds exactly the bytes of the last build, for the send
     // step: the build's own copy when it keeps one, otherwise reportPath.
     // Absolute; empty when the build wrote nothing.
@@ -108,13 +129,25 @@ public:
 
 private:
     class PageWriter;
-    void assemble(const QString &designName, PageWriter &page);
+    void assemble(PageWriter &page);
+    // `name` in the prepared project directory, after the design name when
+    // `designNamed`.
+    QString inProject(const QString &name, bool designNamed = false) const;
 
     Environment m_env;
     CrvC_ReportData m_data;
     QString m_page;
     QString m_pagePath;
     QString m_ownFolder;
+    std::function<void()> m_afterPrompt; // buildReport's busy cursor
+    // Prepared on the GUI thread for write().
+    QString m_designName;
+    QString m_directory;
+    QStringList m_paths;
+    QString m_heading;
+    QString m_versionSection;
+    QString m_runStatistics;
+    QString m_projectStatistics;
     bool m_pageCut = false;
     bool m_written = false;
 };

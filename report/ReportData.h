@@ -42,8 +42,10 @@ struct CrvC_ReportData
     // Command log and fuse log entries, in input order.
     QStringList commandHistory;
 
-    // Send iteration shown in the report; computed once per build.
+    // Send iteration shown in the report; computed once per build. Empty
+    // with projectIterationRead set when the repository could not be read.
     QString projectIteration;
+    bool projectIterationRead = false;
 
     // The project file that readers of project-named files (repository, run
     // records) open: empty when the caller named none.

@@ -13,16 +13,16 @@ namespace {
 
 QString subReport(const QString &path, QLatin1String lineEnd)
 {
-    QString text = QStringLiteral("&nbsp;<BR>");
-    QFile file;
-    if (Port::InputFile::open(path, Port::InputFile::SubReport, file)
-        != Port::InputFile::Status::Opened)
-        return text;
+    const QString empty = QStringLiteral("&nbsp;<BR>");
+    Port::InputFile file;
+    if (file.open(path, Port::InputFile::SubReport) != Port::InputFile::Status::Opened)
+        return empty;
     QTextStream in(&file);
+    QString text = empty;
     QString line;
     while (in.readLineInto(&line))
         text += line + lineEnd;
-    return text;
+    return file.refused() ? empty : text;
 }
 
 } // namespace

@@ -23,29 +23,33 @@ QString secondField(const QString &line)
 
 bool CrvC_SynthesisReport::readTargetInfo(const QString &path, CrvC_ReportData &data)
 {
-    QFile file;
-    if (Port::InputFile::open(path, Port::InputFile::MapReport, file)
-        != Port::InputFile::Status::Opened)
+    Port::InputFile file;
+    if (file.open(path, Port::InputFile::MapReport) != Port::InputFile::Status::Opened)
         return true;
     QTextStream in(&file);
     in.setEncoding(QStringConverter::Utf8);
+    QString device = data.targetDevice, package = data.targetPackage, speed = data.targetSpeed;
     QString line;
     for (int i = 0; i < TargetInfoLines && in.readLineInto(&line); ++i) {
         if (line.startsWith(QLatin1String("Target Device"), Qt::CaseInsensitive))
-            data.targetDevice = secondField(line);
+            device = secondField(line);
         else if (line.startsWith(QLatin1String("Target Package"), Qt::CaseInsensitive))
-            data.targetPackage = secondField(line);
+            package = secondField(line);
         else if (line.startsWith(QLatin1String("Target Speed"), Qt::CaseInsensitive))
-            data.targetSpeed = secondField(line);
+            speed = secondField(line);
+    }
+    if (!file.refused()) {
+        data.targetDevice = device;
+        data.targetPackage = package;
+        data.targetSpeed = speed;
     }
     return true;
 }
 
 bool CrvC_SynthesisReport::readMacroStatistics(const QString &path, CrvC_ReportData &data)
 {
-    QFile file;
-    if (Port::InputFile::open(path, Port::InputFile::SynthesisReport, file)
-        != Port::InputFile::Status::Opened)
+    Port::InputFile file;
+    if (file.open(path, Port::InputFile::SynthesisReport) != Port::InputFile::Status::Opened)
         return true;
     QTextStream in(&file);
     in.setEncoding(QStringConverter::Utf8);
@@ -54,6 +58,7 @@ bool CrvC_SynthesisReport::readMacroStatistics(const QString &path, CrvC_ReportD
     static const QLatin1String equals("=");
     bool inside = false;
     bool inCategory = false; // items go to the latest entry
+    QList<QPair<QString, QStringList>> statistics;
     QString line;
     while (in.readLineInto(&line)) {
         if (line.startsWith(BlockHeader, Qt::CaseInsensitive)) {
@@ -65,15 +70,17 @@ bool CrvC_SynthesisReport::readMacroStatistics(const QString &path, CrvC_ReportD
         } else if (line.startsWith(QLatin1Char('#'))) {
             QString name = line.simplified();
             name.remove(QLatin1Char('#')).replace(separator, equals);
-            data.macroStatistics.append(qMakePair(name, QStringList()));
+            statistics.append(qMakePair(name, QStringList()));
             inCategory = true;
         } else if (!line.isEmpty() && inCategory) {
             QString item = line.simplified();
             item.replace(separator, equals);
-            data.macroStatistics.last().second.append(QLatin1String("<dtag-item1>") % item
-                                                      % QLatin1String("</dtag-item1>"));
+            statistics.last().second.append(QLatin1String("<dtag-item1>") % item
+                                            % QLatin1String("</dtag-item1>"));
         }
     }
+    if (!file.refused())
+        data.macroStatistics += statistics;
     return true;
 }
 

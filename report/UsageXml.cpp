@@ -274,7 +274,7 @@ void appendSpreadTable(const char *title, const QMap<QString, QStringList> &tabl
 bool CrvC_UsageXml::readUsageXml(const QString &path, CrvC_ReportData &data)
 {
     data.usageXmlPath = path;
-    QFile file;
+    Port::InputFile file;
     if (Port::XmlGuard::open(path, Port::InputFile::UsageXml, file)
         != Port::XmlGuard::Outcome::Accepted)
         return false;
@@ -298,7 +298,7 @@ bool CrvC_UsageXml::readUsageXml(const QString &path, CrvC_ReportData &data)
             break;
         }
     }
-    if (reader.hasError())
+    if (reader.hasError() || file.refused())
         return false;
     tables.storeInto(data);
     return true;

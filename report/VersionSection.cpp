@@ -38,15 +38,25 @@ QString CrvC_VersionSection::projectId(const CrvC_ReportData &data,
                                        const CrvC_ReportBuilder::Environment &environment)
 {
     const QString fresh = CrvC_ReportBuilder::withDefaults(environment).newIdentifier();
-    return ProjectRepositoryValues::instance().projectIdentifier(data.projectFileToOpen(), fresh);
+    return repository(environment).projectIdentifier(data.projectFileToOpen(), fresh);
 }
 
-QString CrvC_VersionSection::projectIteration(CrvC_ReportData &data)
+QString CrvC_VersionSection::projectIteration(CrvC_ReportData &data,
+                                              const ProjectRepositoryValues &values)
 {
-    if (data.projectIteration.isEmpty())
-        data.projectIteration =
-            ProjectRepositoryValues::instance().sendIteration(data.projectFileToOpen());
+    // Looked up once: a repository that could not be read when the page was
+    // made must not give the send a counter the page never showed.
+    if (data.projectIteration.isEmpty() && !data.projectIterationRead) {
+        data.projectIteration = values.sendIteration(data.projectFileToOpen());
+        data.projectIterationRead = true;
+    }
     return data.projectIteration;
+}
+
+const ProjectRepositoryValues &
+CrvC_VersionSection::repository(const CrvC_ReportBuilder::Environment &environment)
+{
+    return environment.preview ? ProjectRepositoryValues::readOnly() : ProjectRepositoryValues::instance();
 }
 
 QString CrvC_VersionSection::versionSection(CrvC_ReportData &data,
@@ -62,7 +72,7 @@ QString CrvC_VersionSection::versionSection(CrvC_ReportData &data,
     // Computed in this order: random, project, iteration.
     const QString random = environment.randomId();
     const QString project = projectId(data, environment);
-    const QString iteration = projectIteration(data);
+    const QString iteration = projectIteration(data, repository(environment));
 
     const QDateTime now = environment.now();
 

@@ -2,6 +2,8 @@
 
 #include "ReportBuilder.h"
 
+#include "project/ProjectRepositoryValues.h"
+
 // The "Software Version and Target Device" table: product and version,
 // platform, target, the random, project and iteration identifiers, the
 // registration identifier and the date the report was made.
@@ -16,8 +18,13 @@ public:
                                   const CrvC_ReportBuilder::Environment &environment);
 
     // The send iteration, cached in data.projectIteration: the project's
-    // stored counter when it is a base-10 integer, otherwise "1".
-    static QString projectIteration(CrvC_ReportData &data);
+    // stored counter when it is a base-10 integer, otherwise "1"; empty when
+    // the repository cannot be read.
+    static QString projectIteration(CrvC_ReportData &data,
+                                    const ProjectRepositoryValues &values = ProjectRepositoryValues::instance());
+    // The repository accessor of a build with `environment`: read-only for a
+    // preview.
+    static const ProjectRepositoryValues &repository(const CrvC_ReportBuilder::Environment &environment);
 
     // The project's identifier from the repository of data.projectFileToOpen(). A
     // project file without one gets environment.newIdentifier() stored; without

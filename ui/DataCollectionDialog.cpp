@@ -6,6 +6,7 @@
 #include "host/MsgManData.h"
 #include "host/String.h"
 #include "project/ProjectRepositoryValues.h"
+#include "report/BackgroundBuild.h"
 #include "report/PageStore.h"
 #include "report/PageText.h"
 #include "transmit/MakerServer.h"
@@ -61,7 +62,7 @@ QString cutNotice()
 CrvC_DataCollectionDialog::CrvC_DataCollectionDialog(QWidget *parent, const char *name, bool modal,
                                                      Qt::WindowFlags flags)
     : Gui::Clip::Dialog(parent, nullptr, name, modal, flags)
-    , m_builder(builderEnvironment())
+    , m_builder(std::make_shared<CrvC_ReportBuilder>(builderEnvironment()))
 {
     setWindowTitle(tr("Vantor Corvid Dialog"));
     auto *layout = new QVBoxLayout(this);
@@ -161,8 +162,11 @@ CrvC_DataCollectionDialog::CrvC_DataCollectionDialog(QWidget *parent, const char
 
 CrvC_DataCollectionDialog::~CrvC_DataCollectionDialog()
 {
+    // A build still running removes its own copy when it ends.
+    if (m_build && m_build->abandon())
+        return;
     if (!m_pageHandedOver)
-        m_builder.discardOwnCopy();
+        m_builder->discardOwnCopy();
 }
 
 CrvC_ReportBuilder::Environment CrvC_DataCollectionDialog::builderEnvironment()
@@ -172,14 +176,7 @@ CrvC_ReportBuilder::Environment CrvC_DataCollectionDialog::builderEnvironment()
         bool ok = false;
         designName = QInputDialog::getText(this, tr("Corvid"), tr("Enter the design name:"),
                                            QLineEdit::Normal, QString(), &ok);
-        m_designName = designName.trimmed();
         return ok;
-    };
-    env.setBusy = [](bool busy) {
-        if (busy)
-            QApplication::setOverrideCursor(Qt::WaitCursor);
-        else
-            QApplication::restoreOverrideCursor();
     };
     env.pageFolder = [] { return CrvC_PageStore::newFolder(); };
     return env;
@@ -188,14 +185,41 @@ CrvC_ReportBuilder::Environment CrvC_DataCollectionDialog::builderEnvironment()
 void CrvC_DataCollectionDialog::createReport(const QString &projectFile, const QString &designName,
                                              const QString &targetFamily)
 {
-    m_designName = designName;
-    m_builder.createReport(projectFile, designName, targetFamily);
+    m_builder->createReport(projectFile, designName, targetFamily);
     showContents();
+}
+
+bool CrvC_DataCollectionDialog::startReport(const QString &projectFile, const QString &designName,
+                                            const QString &targetFamily)
+{
+    m_builder->data().targetFamily = targetFamily;
+    if (!m_builder->prepare(projectFile, designName))
+        return false;
+    m_sendButton->setEnabled(false);
+    m_contentsViewer->setPlainText(tr("Building the report..."));
+    m_build = new CrvC_BackgroundBuild(m_builder, this);
+    connect(m_build, &CrvC_BackgroundBuild::finished, this, &CrvC_DataCollectionDialog::onBuildFinished);
+    return true;
+}
+
+bool CrvC_DataCollectionDialog::reportReady() const
+{
+    return !m_build || m_build->isFinished();
+}
+
+void CrvC_DataCollectionDialog::onBuildFinished()
+{
+    m_sendButton->setEnabled(m_builder->written());
+    // A page is put into the view only when someone looks: that takes a
+    // while for a large page.
+    if (isVisible())
+        showContents();
+    emit reportFinished();
 }
 
 QString CrvC_DataCollectionDialog::reportPath() const
 {
-    return m_builder.data().reportPath;
+    return m_builder->data().reportPath;
 }
 
 QString CrvC_DataCollectionDialog::contentsText(const QString &page, bool *cut)
@@ -240,8 +264,15 @@ QString CrvC_DataCollectionDialog::destinationText(const CrvC_SendDispatcher::De
 
 void CrvC_DataCollectionDialog::showContents()
 {
+    if (!reportReady())
+        return;
+    m_contentsShown = true;
+    if (!m_builder->written()) {
+        m_contentsViewer->setPlainText(tr("The report could not be written; nothing will be sent."));
+        return;
+    }
     WaitCursor wait;
-    const QString page = m_builder.pageText();
+    const QString page = m_builder->pageText();
     const QString view = contentsText(page, &m_contentsCut);
     m_contentsViewer->clear();
     m_contentsViewer->setHtml(view);
@@ -253,20 +284,23 @@ void CrvC_DataCollectionDialog::showContents()
 void CrvC_DataCollectionDialog::showEvent(QShowEvent *event)
 {
     m_destinationLabel->setText(destinationText(CrvC_SendDispatcher::destination()));
+    if (!m_contentsShown && m_build && reportReady())
+        showContents();
     Gui::Clip::Dialog::showEvent(event);
 }
 
 void CrvC_DataCollectionDialog::sendData()
 {
-    if (!m_builder.written()) {
+    if (!reportReady() || !m_builder->written()) {
         Port_MsgManData::debugStub("Corvid: no report written, nothing sent\n");
         return;
     }
     m_pageHandedOver = true;
-    CrvC_SendRecorder::noteOrigin(m_builder.pagePath(), m_builder.data().projectFileToOpen(), m_designName);
-    CrvC_SendToClipDlg::showSendMethodDialog(this, m_builder.pagePath());
-    ProjectRepositoryValues::instance().countSend(m_builder.data().projectFileToOpen(),
-                                                  m_builder.projectIteration());
+    CrvC_SendRecorder::noteOrigin(m_builder->pagePath(), m_builder->data().projectFileToOpen(),
+                                  m_builder->designName());
+    CrvC_SendToClipDlg::showSendMethodDialog(this, m_builder->pagePath());
+    ProjectRepositoryValues::instance().countSend(m_builder->data().projectFileToOpen(),
+                                                  m_builder->projectIteration());
 }
 
 void CrvC_DataCollectionDialog::verifyContents()
@@ -276,7 +310,7 @@ void CrvC_DataCollectionDialog::verifyContents()
 
 void CrvC_DataCollectionDialog::browseContents()
 {
-    const QString path = m_builder.pagePath();
+    const QString path = m_builder->pagePath();
     if (path.isEmpty() || !QFileInfo(path).isFile())
         return;
     bool opened = false;

@@ -6,6 +6,9 @@
 
 #include <QUrl>
 
+#include <memory>
+
+class CrvC_BackgroundBuild;
 class CrvC_DataCollectionHtmlViewer;
 class QLabel;
 class QPushButton;
@@ -20,6 +23,10 @@ class QTabWidget;
 // browser. Where the view of the page would drop text, the tab shows the
 // page's exact text instead. A line above the buttons says where the report
 // goes and what travels with it.
+//
+// startReport() builds in the background: the dialog may be shown at once,
+// says that the report is being built, and shows the page when it is ready;
+// until then nothing can be sent.
 //
 // The send step sends the report's own copy of its page, so that a later
 // report cannot change what this one sends; a page that is not sent loses
@@ -47,11 +54,20 @@ public:
     // shows it in the Contents tab.
     void createReport(const QString &projectFile, const QString &designName,
                       const QString &targetFamily);
+    // The same in the background: asks for the design name when it is empty
+    // and the host for its values, here, then reads the files and writes
+    // the page on a thread of its own; reportFinished() follows. False when
+    // nothing is built (the prompt cancelled); nothing follows then.
+    bool startReport(const QString &projectFile, const QString &designName,
+                     const QString &targetFamily);
+    // False while a build started by startReport() runs.
+    bool reportReady() const;
 
     // Where the page is written: the project directory's
     // device_usage_statistics.html, fixed when the dialog was made.
     QString reportPath() const;
-    CrvC_ReportBuilder &builder() { return m_builder; }
+    // Only for a finished build: a background build owns it until then.
+    CrvC_ReportBuilder &builder() { return *m_builder; }
     // Shows the page of the last build in the Contents tab (createReport
     // does this itself).
     void showContents();
@@ -79,10 +95,15 @@ public:
     QPushButton *helpButton() const { return m_helpButton; }
     QLabel *destinationLabel() const { return m_destinationLabel; }
 
+Q_SIGNALS:
+    // The background build has ended, the page written or not.
+    void reportFinished();
+
 public Q_SLOTS:
     // The send step: the send method decision for the report's own copy of
     // its page, then the project's send counter grows by one whatever the
-    // outcome. Without a page (none was written) nothing is sent or counted.
+    // outcome. Without a page (none was written, or still being built)
+    // nothing is sent or counted.
     void sendData();
     void verifyContents();
     // Opens this report's whole page in the web browser.
@@ -100,9 +121,11 @@ private:
     // page must not open an address or a file.
     void onContentsAnchorClicked(const QUrl &url);
     CrvC_ReportBuilder::Environment builderEnvironment();
+    void onBuildFinished();
 
-    CrvC_ReportBuilder m_builder;
-    QString m_designName; // of the last build, for the send history
+    std::shared_ptr<CrvC_ReportBuilder> m_builder;
+    CrvC_BackgroundBuild *m_build = nullptr;
+    bool m_contentsShown = false;
     QTabWidget *m_tabWidget = nullptr;
     CrvC_DataCollectionHtmlViewer *m_introductionViewer = nullptr;
     CrvC_DataCollectionHtmlViewer *m_contentsViewer = nullptr;

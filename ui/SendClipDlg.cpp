@@ -4,6 +4,8 @@
 #include "SendClipDlgImp.h"
 #include "project/CorvidSettings.h"
 
+#include "host/MsgManData.h"
+
 #include <QBoxLayout>
 #include <QTimer>
 #include <QVariant>
@@ -14,7 +16,9 @@ CrvC_SendClipDlg::CrvC_SendClipDlg(QWidget *parent, const QString &projectFile,
 {
     setAttribute(Qt::WA_DeleteOnClose);
     m_reviewDialog = new CrvC_DataCollectionDialog(this, nullptr, true);
-    m_reviewDialog->createReport(projectFile, designName, targetFamily);
+    m_started = m_reviewDialog->startReport(projectFile, designName, targetFamily);
+    connect(m_reviewDialog, &CrvC_DataCollectionDialog::reportFinished, this,
+            &CrvC_SendClipDlg::onReportFinished);
     setSaveAndRestoreGeometryFlag(false);
 
     m_imp = new CrvC_SendClipDlgImp();
@@ -43,6 +47,21 @@ void CrvC_SendClipDlg::OnTimeOut()
     m_imp->progressBar->setValue(m_step);
     if (m_step == Steps) {
         m_timer->stop();
+        // Otherwise the page's arrival sends.
+        if (m_reviewDialog->reportReady())
+            accept();
+    }
+}
+
+void CrvC_SendClipDlg::onReportFinished()
+{
+    if (m_reviewing)
+        return; // the review dialog shows how it went; its buttons decide
+    if (!m_reviewDialog->builder().written()) {
+        Port_MsgManData::debugStub("Corvid: no report written, nothing sent\n");
+        m_timer->stop();
+        reject();
+    } else if (m_step == Steps) {
         accept();
     }
 }
@@ -50,6 +69,7 @@ void CrvC_SendClipDlg::OnTimeOut()
 void CrvC_SendClipDlg::OnDetailsClicked()
 {
     m_timer->stop();
+    m_reviewing = true;
     m_reviewDialog->exec();
     reject();
 }

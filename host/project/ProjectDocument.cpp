@@ -63,28 +63,14 @@ private:
     QXmlStreamAttributes m_attributes;
 };
 
-// Unicode encodings and their subsets: all of their text is kept when the
-// file is saved again (as UTF-8).
-bool isWritableEncoding(const QString &name)
-{
-    static const char *const names[] = {"UTF-8",    "UTF8",     "UTF-16",   "UTF-16LE",
-                                        "UTF-16BE", "UTF-32",   "UTF-32LE", "UTF-32BE",
-                                        "US-ASCII", "ASCII",    "ISO-8859-1", "Latin1"};
-    for (const char *known : names) {
-        if (name.compare(QLatin1String(known), Qt::CaseInsensitive) == 0)
-            return true;
-    }
-    return false;
-}
-
 } // namespace
 
 bool ProjectDocument::read(const QString &path, QString *error)
 {
     const QFileInfo info(path);
-    QFile file;
+    Port::InputFile file;
     QString problem;
-    switch (Port::InputFile::open(path, Port::InputFile::ProjectFile, file, &problem)) {
+    switch (file.open(path, Port::InputFile::ProjectFile, &problem)) {
     case Port::InputFile::Status::Opened:
         break;
     case Port::InputFile::Status::Missing:
@@ -95,8 +81,10 @@ bool ProjectDocument::read(const QString &path, QString *error)
     case Port::InputFile::Status::Unreadable:
         return fail(error, QStringLiteral("%1: cannot be read: %2").arg(path, problem));
     }
-    if (Port::XmlGuard::checkProlog(file, path, Port::InputFile::ProjectFile, &problem)
-        != Port::XmlGuard::Outcome::Accepted)
+    // The guard also refuses encodings other than Unicode and its subsets:
+    // the file is saved as UTF-8, and text from others (UTF-7 can decode to
+    // unpaired surrogates) could be read but not saved again.
+    if (Port::XmlGuard::guard(file, &problem) != Port::XmlGuard::Outcome::Accepted)
         return fail(error, QStringLiteral("%1: not a well-formed project file: %2").arg(path, problem));
 
     ProjectDocument document;
@@ -111,18 +99,6 @@ bool ProjectDocument::read(const QString &path, QString *error)
     ProcessProperty *process = nullptr;
     while (!xml.atEnd() && !xml.hasError()) {
         const QXmlStreamReader::TokenType token = xml.readNext();
-        if (token == QXmlStreamReader::StartDocument) {
-            // The file is saved as UTF-8; an encoding whose text may not
-            // survive that (UTF-7 can decode to unpaired surrogates) would
-            // make a project that can be read but never saved again.
-            const QString encoding = xml.documentEncoding().toString();
-            if (!encoding.isEmpty() && !isWritableEncoding(encoding)) {
-                return fail(error, QStringLiteral("%1: not a project file: its encoding \"%2\" is "
-                                                  "not supported (save it as UTF-8)")
-                                       .arg(path, encoding));
-            }
-            continue;
-        }
         if (token == QXmlStreamReader::EndElement) {
             if (depth == 2)
                 group = Group::None;
@@ -202,6 +178,8 @@ bool ProjectDocument::read(const QString &path, QString *error)
             process->conditions.append(condition);
         }
     }
+    if (file.refused())
+        return fail(error, QStringLiteral("%1: not a well-formed project file: %2").arg(path, file.refusal()));
     if (!xml.hasError() && !sawRoot)
         xml.raiseError(QStringLiteral("no <project> element"));
     if (xml.hasError()) {

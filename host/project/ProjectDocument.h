@@ -67,10 +67,11 @@ public:
 
     // Replaces the contents with those of `path`. False, with a message that
     // names the file and the problem, when the file is missing, unreadable or
-    // not a well-formed project file (which includes an internal DTD subset
-    // and an encoding other than UTF-8, UTF-16, UTF-32, ASCII or Latin-1);
-    // the contents are then unchanged. The file is opened as Port::InputFile
-    // opens inputs (a regular file of at most 64 MiB).
+    // not a well-formed project file (which includes what Port::XmlGuard
+    // refuses: an internal DTD subset, an encoding other than UTF-8, UTF-16,
+    // UTF-32, ASCII or Latin-1, an element with too many attributes); the
+    // contents are then unchanged. The file is opened as Port::InputFile
+    // opens inputs (a regular file, read no further than 64 MiB).
     bool read(const QString &path, QString *error);
     // Writes the contents to `path` (replaced as a whole, or left alone on
     // failure).

@@ -4,6 +4,7 @@
 #include "host/project/RepositoryAccess.h"
 #include "project/ProjectRepositoryValues.h"
 
+#include <QElapsedTimer>
 #include <QProcess>
 #include <QSqlDatabase>
 #include <QtTest>
@@ -23,6 +24,8 @@ private Q_SLOTS:
     void damagedRepository();
     void connectionsAreRemoved();
     void concurrentWritersLoseNothing();
+    void lockedRepository_data();
+    void lockedRepository();
 
 private:
     QString newProject(const QString &name);
@@ -163,6 +166,12 @@ void TestRepository::concurrentWritersLoseNothing()
                               {QStringLiteral("increment"), project, QLatin1String(key),
                                QString::number(times)});
     }
+    // Two senders counting the same project's sends: every send counts.
+    for (int i = 0; i < 2; ++i) {
+        writers.emplace_back(new QProcess);
+        writers.back()->start(QStringLiteral(REPOTOOL),
+                              {QStringLiteral("send"), project, QString::number(times)});
+    }
     for (const auto &writer : writers) {
         QVERIFY(writer->waitForFinished(120000));
         QCOMPARE(writer->exitCode(), 0);
@@ -170,6 +179,49 @@ void TestRepository::concurrentWritersLoseNothing()
     const ProjectRepositoryValues &values = ProjectRepositoryValues::instance();
     QCOMPARE(values.getValue(project, QStringLiteral("first")), QString::number(times));
     QCOMPARE(values.getValue(project, QStringLiteral("second")), QString::number(times));
+    QCOMPARE(values.getValue(project, QLatin1String(ProjectRepositoryValues::SendIterationKey)),
+             QString::number(1 + 2 * times));
+}
+
+void TestRepository::lockedRepository_data()
+{
+    QTest::addColumn<int>("lockMs");
+    QTest::addColumn<bool>("readable");
+    QTest::newRow("locked briefly: waited for") << 300 << true;
+    QTest::newRow("locked for long: nothing read, nothing written") << 9000 << false;
+}
+
+// Another process holds the repository locked while a report is made and
+// sent: the reads wait a little, then give up without taking the stored
+// values for absent ones.
+void TestRepository::lockedRepository()
+{
+    QFETCH(int, lockMs);
+    QFETCH(bool, readable);
+    const QString project = newProject(QStringLiteral("locked"));
+    const ProjectRepositoryValues &values = ProjectRepositoryValues::instance();
+    const QString idKey = QLatin1String(ProjectRepositoryValues::ProjectIdKey);
+    const QString counterKey = QLatin1String(ProjectRepositoryValues::SendIterationKey);
+    const QString id = QStringLiteral("0123456789abcdef0123456789abcdef");
+    values.setValue(project, idKey, id);
+    values.setValue(project, counterKey, QStringLiteral("57"));
+
+    QProcess locker;
+    locker.start(QStringLiteral(REPOTOOL),
+                 {QStringLiteral("lock"), repositoryFile(project), QString::number(lockMs)});
+    QVERIFY(locker.waitForReadyRead(10000));
+    QElapsedTimer timer;
+    timer.start();
+    const QString shownId = values.projectIdentifier(project, QStringLiteral("f").repeated(32));
+    const QString shownIteration = values.sendIteration(project);
+    values.countSend(project, shownIteration);
+    QVERIFY2(timer.elapsed() < 8000, qPrintable(QString::number(timer.elapsed())));
+    QVERIFY(locker.waitForFinished(20000));
+
+    QCOMPARE(shownId, readable ? id : QString());
+    QCOMPARE(shownIteration, readable ? QStringLiteral("57") : QString());
+    QCOMPARE(values.getValue(project, idKey), id);
+    QCOMPARE(values.getValue(project, counterKey), readable ? QStringLiteral("58") : QStringLiteral("57"));
 }
 
 QTEST_GUILESS_MAIN(TestRepository)

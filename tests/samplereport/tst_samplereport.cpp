@@ -34,6 +34,18 @@ bool copyTree(const QString &from, const QString &to)
     return true;
 }
 
+// Every file below `dir`, hidden ones too, with its contents.
+QMap<QString, QByteArray> contents(const QString &dir)
+{
+    QMap<QString, QByteArray> files;
+    QDirIterator it(dir, QDir::Files | QDir::Hidden, QDirIterator::Subdirectories);
+    while (it.hasNext()) {
+        const QString path = it.next();
+        files.insert(path, CorvidTest::readFile(path));
+    }
+    return files;
+}
+
 } // namespace
 
 class TestSampleReport : public QObject
@@ -79,6 +91,8 @@ private Q_SLOTS:
         m_work = m_env->home() + QLatin1String("/work");
         QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/top_usage.xml"), "<usage/>"));
         QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/broken.orb"), "<project"));
+        QVERIFY(QDir().mkpath(m_work + QLatin1String("/fresh"))
+                && QFile::copy(project + QLatin1String("/ledctrl.orb"), m_work + QLatin1String("/fresh/fresh.orb")));
 
         m_projectFile = project + QLatin1String("/ledctrl.orb");
         QString error;
@@ -152,6 +166,9 @@ private Q_SLOTS:
             << QStringList{"--project", "broken.orb", "top_usage.xml"} << 1 << "broken.orb" << QString();
         QTest::newRow("option without value") << QStringList{"top_usage.xml", "--design"} << 1
                                               << "--design needs" << QString();
+        QTest::newRow("project without identifiers, page to --out")
+            << QStringList{"--project", "fresh/fresh.orb", "--out", "fresh.html", "top_usage.xml"} << 0
+            << m_work + "/fresh.html" << m_work + "/fresh.html";
     }
 
     void commandLine()
@@ -160,12 +177,21 @@ private Q_SLOTS:
         QFETCH(int, exitCode);
         QFETCH(QString, expectedOutput);
         QFETCH(QString, expectedPage);
+        // A preview changes nothing but its page, not even a user who has no
+        // random identifier yet.
+        CrvC_Settings::setValue(CrvC_Settings::RandomID, QString());
+        QMap<QString, QByteArray> before = contents(m_env->home());
         const CorvidTest::ToolRun tool =
             CorvidTest::runStaged(QStringLiteral("corvid-report"), arguments, m_work);
         QVERIFY2(tool.output.contains(expectedOutput), qPrintable(tool.output));
         QCOMPARE(tool.exitCode, exitCode);
         if (!expectedPage.isEmpty())
             QVERIFY(CorvidTest::readFile(expectedPage).startsWith("<HTML><HEAD>"));
+        QMap<QString, QByteArray> after = contents(m_env->home());
+        before.remove(expectedPage);
+        after.remove(expectedPage);
+        QCOMPARE(after.keys(), before.keys());
+        QVERIFY(after == before);
     }
 };
 

@@ -2,17 +2,45 @@
 #include "DialogTestSupport.h"
 #include "ModalDialogs.h"
 #include "ui/DataCollectionDialog.h"
+#include "ui/DataCollectionHtmlViewer.h"
 #include "ui/SendClipDlg.h"
 #include "ui/SendClipDlgImp.h"
 #include "ui/SendToClipDlg.h"
 #include "ui/SendToClipDlgImp.h"
+#include "report/BackgroundBuild.h"
 #include "transmit/DataCollectionEmail.h"
 
 #include <QDir>
+#include <QSemaphore>
 #include <QtTest>
 
 using CorvidTest::store;
 using CorvidTest::stored;
+
+// Holds every report build on its thread until released.
+class HeldBuilds
+{
+public:
+    HeldBuilds() { CrvC_BackgroundBuild::setStartHook([this] { m_gate.acquire(); }); }
+    ~HeldBuilds() { finish(); }
+    // Lets one build go and waits, events running, until `review` has its page.
+    bool release(CrvC_DataCollectionDialog *review)
+    {
+        m_gate.release();
+        return QTest::qWaitFor([review] { return review->reportReady(); }, 20000);
+    }
+    // Lets every build go and waits for their threads (also a build whose window is gone).
+    void finish()
+    {
+        m_gate.release(100);
+        CrvC_BackgroundBuild::waitForAll();
+        CrvC_BackgroundBuild::setStartHook({});
+        m_gate.acquire(m_gate.available());
+    }
+
+private:
+    QSemaphore m_gate;
+};
 
 const QString Report = QStringLiteral("/p/device_usage_statistics.html");
 
@@ -165,40 +193,57 @@ private Q_SLOTS:
         QCOMPARE(recorder.sends, expected.isEmpty() ? QStringList() : QStringList{expected});
     }
 
+    // The build is held on its thread until `built`: "at once" (before the ticks), "late" (after
+    // the fifth tick), "in review" (while the review dialog is open), "after" (the window gone).
     void countdown_data()
     {
         QTest::addColumn<QString>("end"); // "ticks", "details", "cancel", "close"
+        QTest::addColumn<QString>("built");
         QTest::addColumn<bool>("sendInReview");
         QTest::addColumn<int>("sends");
         QTest::addColumn<bool>("boxStored");
 
-        QTest::newRow("five ticks") << "ticks" << false << 1 << true;
-        QTest::newRow("Details, declined") << "details" << false << 0 << false;
-        QTest::newRow("Cancel, sent in the review") << "cancel" << true << 1 << false;
-        QTest::newRow("window closed") << "close" << false << 0 << false;
+        QTest::newRow("five ticks") << "ticks" << "at once" << false << 1 << true;
+        QTest::newRow("five ticks, page late: sent once written") << "ticks" << "late" << false << 1 << true;
+        QTest::newRow("Details, declined") << "details" << "at once" << false << 0 << false;
+        QTest::newRow("Details during the build, declined") << "details" << "in review" << false << 0 << false;
+        QTest::newRow("Cancel, sent in the review") << "cancel" << "at once" << true << 1 << false;
+        QTest::newRow("Cancel during the build, sent once shown") << "cancel" << "in review" << true << 1 << false;
+        QTest::newRow("window closed") << "close" << "at once" << false << 0 << false;
+        QTest::newRow("window closed during the build") << "close" << "after" << false << 0 << false;
     }
 
     void countdown()
     {
         QFETCH(QString, end);
+        QFETCH(QString, built);
         QFETCH(bool, sendInReview);
         CorvidTest::SendRecorder recorder;
+        HeldBuilds held;
         QPointer<CrvC_SendClipDlg> dialog =
             new CrvC_SendClipDlg(nullptr, m_env->home() + QLatin1String("/p.orb"), QStringLiteral("top"), QString());
         QVERIFY(dialog->timer()->isActive());
         dialog->show();
+        QVERIFY(!dialog->reviewDialog()->reportReady());
+        const QString reportPath = dialog->reviewDialog()->reportPath();
+        if (built == QLatin1String("at once"))
+            QVERIFY(held.release(dialog->reviewDialog()));
         dialog->imp()->dontShowAgain->setChecked(true);
         for (int tick = 1; tick <= 4; ++tick) {
             dialog->OnTimeOut();
             QCOMPARE(dialog->imp()->progressBar->value(), tick);
         }
         QVERIFY(recorder.sends.isEmpty());
-        const QByteArray page = CorvidTest::readFile(dialog->reviewDialog()->reportPath());
 
-        bool reviewed = false;
+        bool reviewed = false, shownWhenReady = true;
         CrvC_SendClipDlg *countdown = dialog;
         QPointer<QTimer> poll = CorvidTest::onNextModal<CrvC_DataCollectionDialog>([&](CrvC_DataCollectionDialog *review) {
             reviewed = review == countdown->reviewDialog() && !countdown->timer()->isActive();
+            if (built == QLatin1String("in review")) {
+                const auto page = [review] { return review->contentsViewer()->toPlainText(); };
+                shownWhenReady = !page().contains(QLatin1String("Device Usage Page")) && !review->sendButton()->isEnabled()
+                                 && held.release(review) && page().contains(QLatin1String("Device Usage Page"));
+            }
             (sendInReview ? review->sendButton() : review->declineButton())->click();
         });
         if (end == QLatin1String("ticks"))
@@ -210,7 +255,14 @@ private Q_SLOTS:
         else
             dialog->close();
         delete poll;
+        if (built == QLatin1String("late")) {
+            QVERIFY(recorder.sends.isEmpty());
+            QVERIFY(held.release(dialog->reviewDialog()));
+        }
+        const QByteArray page = CorvidTest::readFile(reportPath);
+        held.finish();
 
+        QVERIFY(shownWhenReady);
         QCOMPARE(reviewed, end == QLatin1String("details") || end == QLatin1String("cancel"));
         QTEST(int(recorder.sends.size()), "sends");
         if (!recorder.pages.isEmpty())
@@ -240,6 +292,7 @@ private Q_SLOTS:
             CorvidTest::writeFile(QStringLiteral("top_map.ktp"), "Target Device : " + device + '\n');
             cycles << new CrvC_SendClipDlg(nullptr, QString(), QStringLiteral("top"), QString());
             cycles.last()->timer()->stop();
+            QTRY_VERIFY(cycles.last()->reviewDialog()->reportReady());
             built << CorvidTest::readFile(cycles.last()->reviewDialog()->reportPath());
             QVERIFY(built.last().contains(device));
         }

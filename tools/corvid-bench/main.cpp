@@ -3,13 +3,22 @@
 // at several sizes and times the report build on each, so that the build's
 // growth with its input can be seen. Not a test: it prints figures.
 //
-//   corvid-bench [--scale F] [--steps N] [--usage F] [--keep DIR]
+//   corvid-bench [--scale F] [--steps N] [--usage F] [--keep DIR] [--cycle]
 //
 // --usage F scales the usage XML alone (0.25: a 16 MB usage XML beside a
 // scale-1 command log and core report), for projects of another shape.
 // Scale 1 is the reference project: 200,000 command-log lines, a usage XML of
 // about 63 MB, 20,000 core instances, 20,000 help entries. Step k of N builds
 // the project at k/N of the scale.
+//
+// With --cycle, each step also runs a whole collection cycle (the countdown
+// shown at once, its report built in the background, five one-second ticks,
+// the send started) and prints the longest time the GUI thread handled no
+// events ("stall ms"), measured with a 10 ms timer. The send goes to
+// CORVID_SERVER, which must name this machine (a corvid-receiver as
+// scripts/demo.sh starts it), else to https://127.0.0.1:9, where the upload
+// fails at once; without a proxy, and with settings of its own in the
+// temporary folder, so the user's are neither read nor changed.
 //
 // When xmllint is installed, each step also times `xmllint --noout` on the
 // same usage XML: the cost of merely parsing the largest input, measured in
@@ -18,14 +27,19 @@
 #include "host/Version.h"
 #include "report/ReportBuilder.h"
 #include "ui/DataCollectionDialog.h"
+#include "ui/SendClipDlg.h"
 
 #include <QApplication>
 #include <QDir>
 #include <QElapsedTimer>
 #include <QFile>
 #include <QFileInfo>
+#include <QEventLoop>
+#include <QPointer>
 #include <QProcess>
 #include <QPushButton>
+#include <QTimer>
+#include <QUrl>
 #include <QStandardPaths>
 #include <QTemporaryDir>
 
@@ -268,6 +282,62 @@ qint64 xmllintMs(const QString &xmllint, const QString &file)
     return timer.elapsed();
 }
 
+// Settings, page copies and the server of --cycle: all private to `root`,
+// the server on this machine only. False when CORVID_SERVER names another.
+bool prepareCycle(const QString &root)
+{
+    const QString server = qEnvironmentVariable("CORVID_SERVER");
+    const QString host = QUrl(server).host();
+    if (!server.isEmpty() && host != QLatin1String("127.0.0.1") && host != QLatin1String("localhost")
+        && host != QLatin1String("::1"))
+        return false;
+    if (server.isEmpty())
+        qputenv("CORVID_SERVER", "https://127.0.0.1:9");
+    qputenv("XDG_CONFIG_HOME", QFile::encodeName(root + QLatin1String("/config")));
+    qputenv("XDG_CACHE_HOME", QFile::encodeName(root + QLatin1String("/cache")));
+    QDir().mkpath(root + QLatin1String("/config/orb"));
+    QFile ini(root + QLatin1String("/config/orb/orb.ini"));
+    return ini.open(QIODevice::WriteOnly) && ini.write("[WebUpdate]\nProxyChoice=0\n") > 0;
+}
+
+// One whole cycle in this process, as the plug-in runs it for an opened usage
+// file: the countdown made and shown, five ticks, the send. Answers the
+// longest gap between the ticks of a 10 ms timer on this (the GUI) thread,
+// from before the countdown is made until 2 s after it has closed.
+qint64 cycleStallMs(const QString &design)
+{
+    QElapsedTimer clock;
+    clock.start();
+    qint64 last = 0, longest = 0;
+    QTimer probe;
+    probe.setTimerType(Qt::PreciseTimer);
+    QObject::connect(&probe, &QTimer::timeout, [&] {
+        longest = std::max(longest, clock.elapsed() - last);
+        last = clock.elapsed();
+    });
+    probe.start(10);
+
+    QEventLoop loop;
+    QPointer<CrvC_SendClipDlg> countdown;
+    bool started = false;
+    QTimer watch;
+    QObject::connect(&watch, &QTimer::timeout, [&] {
+        if (!started) {
+            started = true;
+            countdown = new CrvC_SendClipDlg(nullptr, QString(), design, QStringLiteral("Xc6"));
+            countdown->show();
+        } else if (countdown.isNull()) {
+            watch.stop();
+            QTimer::singleShot(2000, &loop, &QEventLoop::quit);
+        }
+    });
+    watch.start(50);
+    QTimer::singleShot(120000, &loop, &QEventLoop::quit);
+    loop.exec();
+    delete countdown;
+    return longest;
+}
+
 } // namespace
 
 int main(int argc, char **argv)
@@ -281,6 +351,7 @@ int main(int argc, char **argv)
     int steps = 4;
     double usageScale = 1.0;
     QString keep;
+    bool cycle = false;
     const QStringList args = app.arguments();
     for (int i = 1; i < args.size(); ++i) {
         if (args.at(i) == QLatin1String("--scale") && i + 1 < args.size())
@@ -291,8 +362,10 @@ int main(int argc, char **argv)
             usageScale = args.at(++i).toDouble();
         else if (args.at(i) == QLatin1String("--keep") && i + 1 < args.size())
             keep = args.at(++i);
+        else if (args.at(i) == QLatin1String("--cycle"))
+            cycle = true;
         else {
-            std::fprintf(stderr, "usage: corvid-bench [--scale F] [--steps N] [--usage F] [--keep DIR]\n");
+            std::fprintf(stderr, "usage: corvid-bench [--scale F] [--steps N] [--usage F] [--keep DIR] [--cycle]\n");
             return 1;
         }
     }
@@ -300,9 +373,13 @@ int main(int argc, char **argv)
     QTemporaryDir temp;
     const QString root = keep.isEmpty() ? temp.path() : QFileInfo(keep).absoluteFilePath();
     const QString xmllint = QStandardPaths::findExecutable(QStringLiteral("xmllint"));
-    std::printf("%-5s %10s %12s %7s %7s %9s %9s %8s %9s %11s %8s %10s\n", "step", "cmd lines",
+    if (cycle && !prepareCycle(root)) {
+        std::fprintf(stderr, "corvid-bench: CORVID_SERVER must name this machine\n");
+        return 1;
+    }
+    std::printf("%-5s %10s %12s %7s %7s %9s %9s %8s %9s %11s %8s %10s %9s\n", "step", "cmd lines",
                 "usage items", "cores", "help", "input MB", "build ms", "cpu ms", "main cpu",
-                "xmllint ms", "peak MB", "dialog ms");
+                "xmllint ms", "peak MB", "dialog ms", "stall ms");
     long buildsPeakKiB = 0, runPeakKiB = 0;
     for (int step = 1; step <= steps; ++step) {
         const Sizes sizes = sizesFor(scale * step / steps, usageScale);
@@ -346,12 +423,14 @@ int main(int argc, char **argv)
             return 1;
         }
         const qint64 floorMs = xmllintMs(xmllint, dir + QLatin1String("/bench_usage.xml"));
-        std::printf("%-5d %10d %12d %7d %7d %9.1f %9lld %8lld %9lld %11s %8.1f %10lld\n", step,
+        const qint64 stallMs = cycle ? cycleStallMs(QStringLiteral("bench")) : -1;
+        std::printf("%-5d %10d %12d %7d %7d %9.1f %9lld %8lld %9lld %11s %8.1f %10lld %9s\n", step,
                     sizes.commandLines, sizes.usageItems, sizes.coreInstances, sizes.helpEntries,
                     bytes / 1048576.0, static_cast<long long>(ms), static_cast<long long>(cpu),
                     static_cast<long long>(mainCpu),
                     floorMs < 0 ? "-" : qPrintable(QString::number(floorMs)),
-                    buildPeak / 1024.0, static_cast<long long>(dialogMs));
+                    buildPeak / 1024.0, static_cast<long long>(dialogMs),
+                    stallMs < 0 ? "-" : qPrintable(QString::number(stallMs)));
         buildsPeakKiB = std::max(buildsPeakKiB, buildPeak);
         if (!stepPeak)
             std::printf("(the peak is the process's so far: it cannot be reset here)\n");

@@ -1,6 +1,7 @@
 // corvid-report: builds device_usage_statistics.html exactly as the collection
 // cycle would, without showing or sending anything, so that a user or an
-// administrator can see what would be sent.
+// administrator can see what would be sent. A preview: it stores nothing but
+// the page (no project identifier, no user identifier, no repository).
 
 #include "host/project/OrbProject.h"
 #include "plugin/CollectionCycle.h"
@@ -25,7 +26,8 @@ const char usage[] =
     "\n"
     "  --project FILE.orb  Make FILE.orb the current project: its directory holds\n"
     "                      the inputs and receives the page, its repository gives\n"
-    "                      the project identifier, send counter and age.\n"
+    "                      the project identifier, send counter and age (read\n"
+    "                      only).\n"
     "  --design NAME       The design name (default: the usage file's name up to\n"
     "                      its last \"_\", e.g. top_usage.xml gives top).\n"
     "  --family TEXT       The target family (default: the project's).\n"
@@ -33,7 +35,8 @@ const char usage[] =
     "  -h, --help          Show this text.\n"
     "\n"
     "Without a project the inputs are read from, and the page written to, the usage\n"
-    "file's directory. Missing inputs give empty sections, not errors.\n"
+    "file's directory. Missing inputs give empty sections, not errors. Nothing but\n"
+    "the page is written: identifiers not stored yet are made for this page only.\n"
     "Exit status: 0 when the page was written, 1 otherwise.\n";
 
 int fail(const QString &message)
@@ -110,7 +113,9 @@ int main(int argc, char **argv)
     if (!haveFamily)
         family = projectFamily;
 
-    CrvC_ReportBuilder builder;
+    CrvC_ReportBuilder::Environment environment;
+    environment.preview = true;
+    CrvC_ReportBuilder builder(environment);
     if (!out.isEmpty())
         builder.setReportPath(out);
     builder.createReport(projectFile, design, family);

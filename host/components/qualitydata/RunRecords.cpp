@@ -42,14 +42,18 @@ QString RunRecords::recordsPath(const QString &projectFile)
 
 bool RunRecords::read(const QString &path)
 {
-    QFile file;
-    if (Port::InputFile::open(path, Port::InputFile::RunRecords, file)
-        != Port::InputFile::Status::Opened)
+    Port::InputFile file;
+    if (file.open(path, Port::InputFile::RunRecords) != Port::InputFile::Status::Opened)
         return false;
+    const QMap<QString, ToolRuns> before = m_tools;
     QTextStream in(&file);
     QString line;
     while (in.readLineInto(&line))
         addLine(line);
+    if (file.refused()) {
+        m_tools = before;
+        return false;
+    }
     return true;
 }
 

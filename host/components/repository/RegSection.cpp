@@ -83,11 +83,25 @@ int RegSection::getValue(const Port::StringBase &key, Port::StringBase &value)
 
 int RegSection::setValue(const Port::StringBase &key, const Port::StringBase &value)
 {
+    return write(key, value, RepositoryStore::Replace, QString());
+}
+
+int RegSection::replaceValue(const Port::StringBase &key, const Port::StringBase *expected,
+                             const Port::StringBase &value)
+{
+    if (!expected)
+        return write(key, value, RepositoryStore::IfAbsent, QString());
+    return write(key, value, RepositoryStore::IfEqual, String::convert(*expected));
+}
+
+int RegSection::write(const Port::StringBase &key, const Port::StringBase &value,
+                      RepositoryStore::Condition condition, const QString &expected)
+{
     if (!(m_mode & ModeWrite))
         return StatusDenied;
     if (key.IsEmpty())
         return StatusFailed;
-    return m_store->setValue(m_id, String::convert(key), String::convert(value));
+    return m_store->setValue(m_id, String::convert(key), String::convert(value), condition, expected);
 }
 
 } // namespace Prjrep

@@ -24,12 +24,17 @@ public:
     void releaseSubSection(IRegSection *subSection) override;
     int getValue(const Port::StringBase &key, Port::StringBase &value) override;
     int setValue(const Port::StringBase &key, const Port::StringBase &value) override;
+    int replaceValue(const Port::StringBase &key, const Port::StringBase *expected,
+                     const Port::StringBase &value) override;
 
     // Whether `mode` is one a section can be opened with, and whether it may
     // create what is missing. Used for sections and sub-sections alike.
     static int checkMode(int mode, bool storeWritable);
 
 private:
+    int write(const Port::StringBase &key, const Port::StringBase &value,
+              RepositoryStore::Condition condition, const QString &expected);
+
     std::shared_ptr<RepositoryStore> m_store;
     qint64 m_id;
     Port::StringBase m_name;

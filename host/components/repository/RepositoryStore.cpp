@@ -3,6 +3,7 @@
 #include "host/Repository.h"
 
 #include <QAtomicInteger>
+#include <QElapsedTimer>
 #include <QFileInfo>
 #include <QSqlDatabase>
 #include <QSqlError>
@@ -14,9 +15,11 @@ namespace Prjrep {
 namespace {
 
 // How long one statement waits for a lock held by another connection, and
-// how often a transaction that still found the file locked is tried again.
-const int BusyTimeoutMs = 2000;
-const int MaxAttempts = 8;
+// how long an operation keeps trying again before it fails. The host waits
+// meanwhile, so the wait is short: a repository locked for longer reads as
+// unreadable, never as empty.
+const int BusyTimeoutMs = 250;
+const int WaitMs = 2000;
 
 bool isBusy(const QSqlError &error)
 {
@@ -112,7 +115,9 @@ RepositoryStore::~RepositoryStore()
 int RepositoryStore::run(bool write, const std::function<int(QSqlQuery &)> &work)
 {
     const QSqlDatabase db = QSqlDatabase::database(m_connectionName, false);
-    for (int attempt = 1;; ++attempt) {
+    QElapsedTimer waited;
+    waited.start();
+    for (;;) {
         QSqlQuery query(db);
         query.setForwardOnly(true);
         bool busy = false;
@@ -132,14 +137,24 @@ int RepositoryStore::run(bool write, const std::function<int(QSqlQuery &)> &work
                 rollback.exec(QStringLiteral("ROLLBACK"));
             }
         }
-        if (!busy || attempt >= MaxAttempts)
+        if (!busy || waited.elapsed() >= WaitMs)
             return StatusFailed;
-        QThread::msleep(20 * attempt);
+        QThread::msleep(20);
     }
 }
 
 int RepositoryStore::createSchema()
 {
+    // Looked at first, so that opening a repository that has its tables
+    // writes nothing (and need not wait for another process's write).
+    const int existing = run(false, [](QSqlQuery &query) {
+        QVariant version;
+        if (selectOne(query, QStringLiteral("PRAGMA user_version"), {}, &version) != StatusOk)
+            return int(StatusFailed);
+        return version.toInt() >= 1 ? int(StatusOk) : int(StatusNotFound);
+    });
+    if (existing != StatusNotFound)
+        return existing;
     return run(true, [](QSqlQuery &query) {
         const bool ok =
             query.exec(QStringLiteral("CREATE TABLE IF NOT EXISTS sections("
@@ -191,11 +206,25 @@ int RepositoryStore::value(qint64 section, const QString &key, QString *value)
     });
 }
 
-int RepositoryStore::setValue(qint64 section, const QString &key, const QString &value)
+int RepositoryStore::setValue(qint64 section, const QString &key, const QString &value,
+                              Condition condition, const QString &expected)
 {
     if (!m_writable)
         return StatusDenied;
     return run(true, [&](QSqlQuery &query) {
+        if (condition != Replace) {
+            QVariant stored;
+            const int status = selectOne(
+                query, QStringLiteral("SELECT value FROM entries WHERE section = ? AND key = ?"),
+                {section, key}, &stored);
+            if (status == StatusFailed)
+                return int(StatusFailed);
+            const bool holds = condition == IfAbsent ? status == StatusNotFound
+                                                     : status == StatusOk && stored.toString() == expected;
+            if (!holds)
+                return int(StatusConflict);
+            query.finish();
+        }
         return execute(query,
                        QStringLiteral("INSERT OR REPLACE INTO entries(section, key, value) VALUES(?, ?, ?)"),
                        {section, key, value})

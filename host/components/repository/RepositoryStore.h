@@ -15,10 +15,10 @@ namespace Prjrep {
 //   sections(id INTEGER PRIMARY KEY, parent INTEGER, name TEXT, UNIQUE(parent, name))
 //   entries(section INTEGER, key TEXT, value TEXT, PRIMARY KEY(section, key))
 //
-// Every write is one "BEGIN IMMEDIATE" transaction. A locked file is waited
-// for (busy timeout) and the whole transaction retried a few times, so that
-// writers in several processes all get their turn. Answers Prjrep::Status
-// values.
+// Every write is one "BEGIN IMMEDIATE" transaction. A file locked by another
+// connection is waited for, the statement retried in short turns so that
+// writers in several processes all get theirs, for two seconds at most per
+// operation; then the operation fails. Answers Prjrep::Status values.
 class RepositoryStore
 {
 public:
@@ -39,13 +39,23 @@ public:
     // created when missing if `create` is set.
     int findSection(qint64 parent, const QString &name, bool create, qint64 *id);
     int value(qint64 section, const QString &key, QString *value);
-    int setValue(qint64 section, const QString &key, const QString &value);
+
+    enum Condition {
+        Replace,  // whatever is stored
+        IfAbsent, // only when the key has no value
+        IfEqual,  // only when the key holds `expected`
+    };
+    // Stores `value` under `key` when `condition` holds (else
+    // StatusConflict), in one transaction.
+    int setValue(qint64 section, const QString &key, const QString &value,
+                 Condition condition = Replace, const QString &expected = QString());
 
 private:
     RepositoryStore(const QString &connectionName, bool writable);
 
     // Runs `work` (answering a status), inside a write transaction when
-    // `write` is set, retrying while the file is locked by someone else.
+    // `write` is set, retrying while the file is locked by someone else and
+    // time is left. A write transaction is rolled back when `work` fails.
     int run(bool write, const std::function<int(QSqlQuery &)> &work);
     int createSchema();
 
