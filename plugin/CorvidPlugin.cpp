@@ -73,11 +73,9 @@ void removeHandlers()
 {
     CrvC_UserNotice::setHandlers({}, {});
     CrvC_CollectionCycle::setDialogs({});
-    // The history's last writes, and their answers waiting in the event
-    // queue, run while their code is still loaded.
-    CrvC_SendRecorder::waitForDone();
-    if (QCoreApplication::instance())
-        QCoreApplication::sendPostedEvents(QCoreApplication::instance(), QEvent::MetaCall);
+    // The history's last writes, and their answers, run while their code is
+    // still loaded.
+    CrvC_SendRecorder::shutdown();
 }
 
 } // namespace

@@ -412,7 +412,9 @@ qint64 CrvC_SendHistory::addEntry(const Entry &entry, const QByteArray &page, qi
 qint64 CrvC_SendHistory::addEntry(const Entry &entry, const QString &path, qint64 *attemptId)
 {
     QFile file(path);
-    if (!file.open(QIODevice::ReadOnly) || file.size() <= m_limits.maxBytes)
+    if (!file.open(QIODevice::ReadOnly))
+        return addEntry(entry, QByteArray(), attemptId); // the send fails too; its try is recorded
+    if (file.size() <= m_limits.maxBytes)
         return addEntry(entry, file.readAll(), attemptId);
     QCryptographicHash sha(QCryptographicHash::Sha256);
     sha.addData(&file);

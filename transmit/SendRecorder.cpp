@@ -31,11 +31,30 @@ QList<Origin> &origins()
     return list;
 }
 
+QThreadPool &worker();
+
+void drainWorker()
+{
+    worker().waitForDone();
+}
+
+bool &drainRegistered()
+{
+    static bool registered = false;
+    return registered;
+}
+
 QThreadPool &worker()
 {
     // One thread: the history's changes are made in the order of the calls.
     static QThreadPool pool;
-    pool.setMaxThreadCount(1);
+    if (!drainRegistered()) {
+        pool.setMaxThreadCount(1);
+        // The last writes end before the application object goes: they
+        // answer through it, and the database driver belongs to it.
+        qAddPostRoutine(drainWorker);
+        drainRegistered() = true;
+    }
     return pool;
 }
 
@@ -179,4 +198,15 @@ void CrvC_SendRecorder::run(std::function<void(CrvC_SendHistory &)> work, QObjec
 void CrvC_SendRecorder::waitForDone()
 {
     worker().waitForDone();
+}
+
+void CrvC_SendRecorder::shutdown()
+{
+    waitForDone();
+    if (drainRegistered()) {
+        qRemovePostRoutine(drainWorker);
+        drainRegistered() = false;
+    }
+    if (QCoreApplication::instance())
+        QCoreApplication::sendPostedEvents(QCoreApplication::instance(), QEvent::MetaCall);
 }

@@ -62,7 +62,10 @@ public:
     // `done` on the GUI thread unless `context` is gone by then.
     static void run(std::function<void(CrvC_SendHistory &history)> work, QObject *context,
                     std::function<void()> done);
-    // Waits until the worker has written everything (before the plug-in is
-    // unloaded, before a tool exits).
+    // Waits until the worker has written everything. The application
+    // object waits for it too before it goes.
     static void waitForDone();
+    // Before the code goes (the plug-in is unloaded): waits, then delivers
+    // the answers already waiting in the event queue.
+    static void shutdown();
 };
