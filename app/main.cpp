@@ -6,6 +6,7 @@
 #include "Orb.h"
 #include "PluginManager.h"
 
+#include "host/StatusLine.h"
 #include "host/gui/ApplicationBase.h"
 #include "host/project/OrbProject.h"
 
@@ -24,7 +25,8 @@ const char usage[] =
     "Usage: orb [options] [command]\n"
     "\n"
     "The Orb design environment. Without a command it opens the main window\n"
-    "(File > Open..., Edit > Preferences...).\n"
+    "(File > Open..., Edit > Preferences..., Help > About) with the current\n"
+    "project's name in its title and a status bar.\n"
     "\n"
     "Commands:\n"
     "  open FILE            Open FILE with the file editor that claims it best (the\n"
@@ -32,6 +34,8 @@ const char usage[] =
     "                       suitability). orb then runs until the editor's work is\n"
     "                       over (its windows closed, its child processes done) and\n"
     "                       exits 0. A file that no editor claims: exit status 1.\n"
+    "                       What the status bar would show (such as how a usage\n"
+    "                       report was sent) goes to standard output.\n"
     "  new-project FILE.orb [--family F] [--device D] [--package P] [--speed S]\n"
     "                       Create the project file FILE.orb for the given target\n"
     "                       and its project repository (FILE.orbrepo beside it),\n"
@@ -173,6 +177,11 @@ int main(int argc, char **argv)
         return app.exec();
     }
 
+    // Without a window the status line goes to standard output.
+    Port::StatusLine::setDisplay([](const QString &text) {
+        std::printf("orb: %s\n", qUtf8Printable(text));
+        std::fflush(stdout);
+    });
     const QString absolute = QFileInfo(file).absoluteFilePath();
     QString projectName = Orb::currentProjectName();
     if (projectName.isEmpty())

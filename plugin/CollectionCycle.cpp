@@ -1,5 +1,6 @@
 #include "CollectionCycle.h"
 #include "project/CorvidSettings.h"
+#include "transmit/SendRetry.h"
 
 #include "host/AutoRelease.h"
 #include "host/FileEditorManager.h"
@@ -100,6 +101,9 @@ void CrvC_CollectionCycle::openUsageFile(const QString &fileName, CitI::IInterfa
         Port_MsgManData::debugStub("Corvid: collection is switched off\n");
         return;
     }
+    // Failed uploads of earlier cycles go again first, within the same
+    // consent; Corvid keeps no timer of its own for them.
+    CrvC_SendRetry::retryPending();
     startCollection(projectFile, design, targetFamily);
 }
 

@@ -5,6 +5,7 @@
 #include "ui/SendClipDlg.h"
 #include "ui/SendToClipDlg.h"
 
+#include "transmit/SendRecorder.h"
 #include "transmit/UserNotice.h"
 
 #include "host/FileSupervisor.h"
@@ -72,6 +73,9 @@ void removeHandlers()
 {
     CrvC_UserNotice::setHandlers({}, {});
     CrvC_CollectionCycle::setDialogs({});
+    // The history's last writes, and their answers, run while their code is
+    // still loaded.
+    CrvC_SendRecorder::shutdown();
 }
 
 } // namespace

@@ -98,6 +98,8 @@ public:
     // True when the last build wrote the file (and its own copy).
     bool written() const { return m_written; }
     QString reportPath() const { return m_data.reportPath; }
+    // The design of the last build, as given or entered at the prompt.
+    QString designName() const { return m_designName; }
     // The file that holds exactly the bytes of the last build, for the send
     // step: the build's own copy when it keeps one, otherwise reportPath.
     // Absolute; empty when the build wrote nothing.

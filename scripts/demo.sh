@@ -9,7 +9,9 @@
 #   4. orb opens the sample's usage file: the Corvid plug-in builds the page,
 #      counts down five seconds and uploads it through vancurl
 #   5. the page, the project's send counter and what the receiver stored
-#   6. the received page read into an SQLite database, and the reports per
+#   6. the send history: corvid-history lists the send and gives back the
+#      exact bytes the receiver stored
+#   7. the received page read into an SQLite database, and the reports per
 #      target family it holds
 #
 # Everything stays under build/demo: private HOME and XDG folders, so the
@@ -104,6 +106,8 @@ if ! ORB_DEBUG=1 "$STAGE/bin/orb" --project "$PROJECT/ledctrl.orb" open "$PROJEC
     exit 1
 fi
 grep -E '^Corvid' "$DEMO/orb.log" | sed 's/^/   /' || true
+echo "== orb's status line"
+grep -E '^orb: ' "$DEMO/orb.log" | sed 's/^/   /' || true
 
 iteration() {
     sed -n 's/.*name="ProjectIteration">\([^<]*\)<.*/\1/p' "$1" | head -n 1
@@ -138,6 +142,16 @@ if [ $found = 0 ]; then
     exit 1
 fi
 
+echo "== the send history (corvid-history list, in the demo's home)"
+"$STAGE/bin/corvid-history" list | sed 's/^/   /'
+ID=$("$STAGE/bin/corvid-history" list | awk 'NR == 1 { print $1 }')
+if [ -n "$ID" ] && "$STAGE/bin/corvid-history" show "$ID" | cmp -s - "$stored"; then
+    echo "   corvid-history show $ID gives back the bytes the receiver stored"
+else
+    echo "demo: the send history does not hold the report the receiver stored" >&2
+    exit 1
+fi
+echo "   (HOME=$HOME XDG_DATA_HOME=$XDG_DATA_HOME $STAGE/bin/corvid-history list)"
 echo "== corvid-ingest: the received page into the back end's database ($DEMO/corvid.sqlite)"
 "$STAGE/bin/corvid-ingest" --db "sqlite:$DEMO/corvid.sqlite" "$DEMO/received"
 echo "== corvid-stats families"

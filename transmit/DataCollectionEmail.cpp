@@ -17,7 +17,7 @@ QStringList CrvC_DataCollectionEmail::emailTools()
     return m_impl->emailTools();
 }
 
-void CrvC_DataCollectionEmail::send(const QString &tool, const QString &to, const QString &subject,
+bool CrvC_DataCollectionEmail::send(const QString &tool, const QString &to, const QString &subject,
                                     const QString &body, const QString &file)
 {
     m_tool = tool;
@@ -29,7 +29,7 @@ void CrvC_DataCollectionEmail::send(const QString &tool, const QString &to, cons
             tr("Its path %1 holds a character, such as a line break, that cannot be passed on. Send the "
                "report over HTTPS, or move the project to a folder whose path has none.")
                 .arg(file));
-        return;
+        return false;
     }
 
     // The mail program runs detached: it may stay open after the host has
@@ -41,10 +41,11 @@ void CrvC_DataCollectionEmail::send(const QString &tool, const QString &to, cons
     process.setProgram(tool);
     process.setArguments(arguments);
     process.setStandardInputFile(QProcess::nullDevice());
-    if (!process.startDetached()) {
-        m_startError = process.errorString();
-        onProcessError(QProcess::FailedToStart);
-    }
+    if (process.startDetached())
+        return true;
+    m_startError = process.errorString();
+    onProcessError(QProcess::FailedToStart);
+    return false;
 }
 
 bool CrvC_DataCollectionEmail::canPassFile(const QString &file)

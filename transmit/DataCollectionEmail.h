@@ -28,8 +28,10 @@ public:
     // The mail programs to offer, the preferred one first.
     QStringList emailTools();
 
-    // Starts `tool` composing a message; returns once it has started or failed.
-    void send(const QString &tool, const QString &to, const QString &subject,
+    // Starts `tool` composing a message; returns once it has started
+    // (true) or failed (false, reported through onProcessError when the
+    // program could not be run).
+    bool send(const QString &tool, const QString &to, const QString &subject,
               const QString &body, const QString &file);
 
     // False for a report path that no mail program could be given

@@ -13,6 +13,7 @@
 #include <QCoreApplication>
 #include <QEventLoopLocker>
 #include <QFileInfo>
+#include <QRegularExpression>
 #include <QTimer>
 #include <QUrl>
 
@@ -58,6 +59,13 @@ QByteArray forDebug(const QByteArray &text)
 const qint64 MaxLookupAnswer = 1024 * 1024;
 // Of the upload's answer only the start is kept, for the debug output.
 const int MaxUploadAnswer = 4096;
+
+// The HTTP status in vancurl's reason line, 0 when it names none.
+int httpStatusIn(const QString &reason)
+{
+    static const QRegularExpression status(QStringLiteral("\\bHTTP status (\\d{3})\\b"));
+    return status.match(reason).captured(1).toInt();
+}
 
 std::shared_ptr<QEventLoopLocker> keepApplicationAlive()
 {
@@ -119,6 +127,9 @@ QStringList CrvC_SendUsingSSL::uploadArguments(const QString &url) const
 
 void CrvC_SendUsingSSL::SendFile(const QString &file)
 {
+    // Recorded before anything is looked up or sent.
+    if (!m_ticket)
+        m_ticket = CrvC_SendRecorder::begin(CrvC_SendHistory::Method::Upload, file, CrvC_MakerServer::baseUrl());
     if (!m_proxyKnown) {
         // The proxy is found in the background (it may take seconds); the
         // send goes on with its answer.
@@ -174,7 +185,7 @@ void CrvC_SendUsingSSL::lookupFailedToStart()
     CrvC_SendFailure::Run run = lookupRun();
     run.started = false;
     run.reason = m_lookupProcess->errorString();
-    reportFailure(m_reportFile, run);
+    reportFailure(m_ticket, run);
     m_lookupProcess->deleteLater();
     deleteLater();
 }
@@ -199,7 +210,7 @@ void CrvC_SendUsingSSL::LaunchSSLProcess()
 
     if (address.isEmpty()) {
         Port_MsgManData::debugStub("Corvid ERROR: Redirected URL is empty.\n");
-        reportFailure(m_reportFile, run);
+        reportFailure(m_ticket, run);
     } else {
         Port_MsgManData::debugStub("Corvid: SSL process to %s has started.\n", qUtf8Printable(address));
         startUpload(address);
@@ -213,7 +224,18 @@ void CrvC_SendUsingSSL::startUpload(const QString &address)
     // The upload outlives this object: it owns itself and is released when it
     // ends, holding the application open until then.
     auto *upload = new QProcess;
-    const QString reportFile = m_reportFile;
+    const QStringList arguments = uploadArguments(address);
+    const auto field = [&arguments](const QString &name) {
+        const QString prefix = name + QLatin1Char('=');
+        for (const QString &argument : arguments) {
+            if (argument.startsWith(prefix))
+                return argument.mid(prefix.size());
+        }
+        return QString();
+    };
+    CrvC_SendRecorder::uploadStarted(m_ticket, address, field(QStringLiteral("domain")),
+                                     field(QStringLiteral("regid")));
+    const CrvC_SendRecorder::Ticket ticket = m_ticket;
     CrvC_SendFailure::Run run;
     run.step = CrvC_SendFailure::Step::Upload;
     run.url = address;
@@ -227,7 +249,7 @@ void CrvC_SendUsingSSL::startUpload(const QString &address)
     };
     connect(upload, &QProcess::readyReadStandardOutput, upload, keepAnswerStart);
     connect(upload, &QProcess::finished, upload,
-            [upload, reportFile, run, keepAlive, answerStart, keepAnswerStart] {
+            [upload, ticket, run, keepAlive, answerStart, keepAnswerStart] {
                 keepAnswerStart();
                 const QByteArray answer = forDebug(*answerStart);
                 CrvC_SendFailure::Run ended = run;
@@ -235,15 +257,17 @@ void CrvC_SendUsingSSL::startUpload(const QString &address)
                 ended.reason = QString::fromUtf8(forDebug(upload->readAllStandardError()));
                 Port_MsgManData::debugStub("Corvid: SSL upload ended with exit status %d: %s\n",
                                            ended.exitStatus, answer.constData());
-                if (ended.exitStatus != 0) {
+                if (ended.exitStatus == 0) {
+                    CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Sent, QString::fromUtf8(answer), 0);
+                } else {
                     Port_MsgManData::debugStub("Corvid ERROR: SSL upload failed: %s\n",
                                                qUtf8Printable(ended.reason));
-                    reportFailure(reportFile, ended);
+                    reportFailure(ticket, ended);
                 }
                 upload->deleteLater();
             });
     connect(upload, &QProcess::errorOccurred, upload,
-            [upload, reportFile, run, keepAlive](QProcess::ProcessError error) {
+            [upload, ticket, run, keepAlive](QProcess::ProcessError error) {
                 if (error != QProcess::FailedToStart)
                     return; // the finished signal follows
                 Port_MsgManData::debugStub("Corvid ERROR: cannot start %s: %s\n", ProgramName,
@@ -252,11 +276,9 @@ void CrvC_SendUsingSSL::startUpload(const QString &address)
                 notStarted.started = false;
                 notStarted.reason = upload->errorString();
                 upload->deleteLater();
-                QTimer::singleShot(0, [reportFile, notStarted, keepAlive] {
-                    reportFailure(reportFile, notStarted);
-                });
+                QTimer::singleShot(0, [ticket, notStarted, keepAlive] { reportFailure(ticket, notStarted); });
             });
-    upload->start(QLatin1String(ProgramName), uploadArguments(address), QIODevice::ReadWrite);
+    upload->start(QLatin1String(ProgramName), arguments, QIODevice::ReadWrite);
 }
 
 CrvC_SendFailure::Run CrvC_SendUsingSSL::lookupRun() const
@@ -273,10 +295,16 @@ int CrvC_SendUsingSSL::exitStatusOf(const QProcess *process)
     return process->exitStatus() == QProcess::NormalExit ? process->exitCode() : -1;
 }
 
-void CrvC_SendUsingSSL::reportFailure(const QString &reportFile, const CrvC_SendFailure::Run &run)
+void CrvC_SendUsingSSL::reportFailure(const CrvC_SendRecorder::Ticket &ticket, const CrvC_SendFailure::Run &run)
 {
-    CrvC_UserNotice::warning(tr(FailureText), CrvC_SendFailure::details(run, reportFile));
-    CrvC_UserNotice::offerEmail(reportFile);
+    CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Failed, CrvC_SendFailure::cause(run),
+                              run.started ? run.exitStatus : -1, httpStatusIn(run.reason));
+    // A retry's failure is in the history and on the status line; only a
+    // send the user started gets the warning and the other method offered.
+    if (ticket->interactive) {
+        CrvC_UserNotice::warning(tr(FailureText), CrvC_SendFailure::details(run, ticket->reportFile));
+        CrvC_UserNotice::offerEmail(ticket->reportFile);
+    }
 }
 
 QString CrvC_SendUsingSSL::uploadAddress(QIODevice *output)

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "transmit/SendFailure.h"
+#include "transmit/SendRecorder.h"
 
 #include <QObject>
 #include <QProcess>
@@ -16,10 +17,12 @@ class QIODevice;
 // Sends the report to the maker over HTTPS through the transfer tool vancurl:
 // a lookup of the current upload address at the maker's redirect service,
 // then the form upload. Create it with new, call SendFile once and forget it:
-// it deletes itself. A lookup or upload that fails warns the user and offers
-// the e-mail method (CrvC_UserNotice), with the cause beneath the warning
-// (CrvC_SendFailure). The application is kept running
-// (QEventLoopLocker) until the upload has ended.
+// it deletes itself. Every send is recorded in the send history
+// (CrvC_SendRecorder) from before the proxy is found to its outcome. A lookup
+// or upload that fails warns the user and offers the e-mail method
+// (CrvC_UserNotice), with the cause beneath the warning (CrvC_SendFailure),
+// unless it was a retry of a recorded failure. The application is kept
+// running (QEventLoopLocker) until the upload has ended.
 class CrvC_SendUsingSSL : public QObject
 {
     Q_OBJECT
@@ -37,6 +40,10 @@ public:
     // Uses `proxy` ("host:port", empty for none) without any discovery.
     explicit CrvC_SendUsingSSL(const QString &proxy);
     ~CrvC_SendUsingSSL() override;
+
+    // Makes this send a further attempt of a history entry instead of a new
+    // entry (retries); call before SendFile.
+    void setTicket(CrvC_SendRecorder::Ticket ticket) { m_ticket = std::move(ticket); }
 
     // Starts the lookup for the report at the absolute path `file`.
     void SendFile(const QString &file);
@@ -81,7 +88,9 @@ private:
     void startUpload(const QString &address);
     CrvC_SendFailure::Run lookupRun() const;
     static int exitStatusOf(const QProcess *process);
-    static void reportFailure(const QString &reportFile, const CrvC_SendFailure::Run &run);
+    // Records the failure; a send the user started also gets the warning
+    // and the offer of the e-mail method.
+    static void reportFailure(const CrvC_SendRecorder::Ticket &ticket, const CrvC_SendFailure::Run &run);
 
     QString m_proxy;
     bool m_proxyKnown = true;
@@ -90,4 +99,5 @@ private:
     QProcess *m_lookupProcess = nullptr;
     bool m_ended = false;
     std::shared_ptr<QEventLoopLocker> m_keepAlive;
+    CrvC_SendRecorder::Ticket m_ticket;
 };

@@ -10,6 +10,7 @@
 #include "report/PageStore.h"
 #include "report/PageText.h"
 #include "transmit/MakerServer.h"
+#include "transmit/SendRecorder.h"
 
 #include <QApplication>
 #include <QFileInfo>
@@ -295,6 +296,8 @@ void CrvC_DataCollectionDialog::sendData()
         return;
     }
     m_pageHandedOver = true;
+    CrvC_SendRecorder::noteOrigin(m_builder->pagePath(), m_builder->data().projectFileToOpen(),
+                                  m_builder->designName());
     CrvC_SendToClipDlg::showSendMethodDialog(this, m_builder->pagePath());
     ProjectRepositoryValues::instance().countSend(m_builder->data().projectFileToOpen(),
                                                   m_builder->projectIteration());

@@ -1,4 +1,5 @@
 #include "DataCollectionPropPageImpl.h"
+#include "SendHistoryDialog.h"
 
 #include "host/gui/PropSheetEvent.h"
 #include "transmit/DataCollectionEmail.h"
@@ -22,6 +23,7 @@ CrvC_DataCollectionPropPageImpl::CrvC_DataCollectionPropPageImpl(QWidget *parent
     vboxLayout->insertWidget(vboxLayout->indexOf(collectionCheckBox) + 1, m_administratorNote);
     connect(sslRadioButton, &QAbstractButton::toggled, this,
             &CrvC_DataCollectionPropPageImpl::OnSSLButtonStateChanged);
+    connect(sentReportsButton, &QAbstractButton::clicked, this, &CrvC_DataCollectionPropPageImpl::showSentReports);
 }
 
 CrvC_DataCollectionPropPageImpl::~CrvC_DataCollectionPropPageImpl() = default;
@@ -98,4 +100,10 @@ QStringList CrvC_DataCollectionPropPageImpl::emailToolNames()
 void CrvC_DataCollectionPropPageImpl::OnSSLButtonStateChanged(bool on)
 {
     selectEmailTool->setEnabled(!on);
+}
+
+void CrvC_DataCollectionPropPageImpl::showSentReports()
+{
+    CrvC_SendHistoryDialog dialog(this);
+    dialog.exec();
 }

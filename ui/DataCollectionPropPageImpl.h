@@ -33,6 +33,8 @@ public:
 
 public Q_SLOTS:
     void OnSSLButtonStateChanged(bool on);
+    // Opens the send history ("Sent reports...").
+    void showSentReports();
 
 protected:
     void customEvent(QEvent *event) override;

@@ -57,6 +57,12 @@ void Environment::clearSettings() const
     QFile::remove(Gui::Clip::Settings::userFileName());
 }
 
+QStringList Environment::locations()
+{
+    return {QLatin1String("XDG_CONFIG_HOME=") + QFileInfo(Gui::Clip::Settings::userFileName()).absolutePath().chopped(4),
+            QLatin1String("XDG_DATA_HOME=") + QStandardPaths::writableLocation(QStandardPaths::GenericDataLocation)};
+}
+
 ToolRun runStaged(const QString &program, const QStringList &arguments, const QString &workDir,
                   const QStringList &environment)
 {
@@ -70,7 +76,8 @@ ToolRun runStaged(const QString &program, const QStringList &arguments, const QS
     tool.start(Environment::stageDir() + QLatin1String("/bin/") + program, arguments);
     ToolRun run;
     const bool finished = tool.waitForFinished(60000);
-    run.output = QString::fromUtf8(tool.readAllStandardOutput() + tool.readAllStandardError());
+    run.standardOutput = tool.readAllStandardOutput();
+    run.output = QString::fromUtf8(run.standardOutput + tool.readAllStandardError());
     if (finished && tool.exitStatus() == QProcess::NormalExit)
         run.exitCode = tool.exitCode();
     return run;

@@ -33,6 +33,9 @@ public:
     bool writeDataFile(const QString &relativePath, const QByteArray &contents) const;
     // Removes the per-user settings file (all groups).
     void clearSettings() const;
+    // The test's own settings and data locations (QStandardPaths' test
+    // mode) as "XDG_...=" entries, for staged programs that are to share them.
+    static QStringList locations();
 
     // The staged build: orb, plug-ins, component libraries, data.
     static QString stageDir() { return QStringLiteral(ORB_STAGE_DIR); }
@@ -47,6 +50,7 @@ struct ToolRun
 {
     int exitCode = -1; // -1 when it crashed or did not finish within a minute
     QString output;    // standard output followed by standard error
+    QByteArray standardOutput;
 };
 
 // Runs <stage>/bin/<program> with `arguments` in `workDir` on the offscreen

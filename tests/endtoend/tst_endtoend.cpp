@@ -13,6 +13,7 @@
 #include "host/project/OrbProject.h"
 #include "project/CorvidSettings.h"
 #include "project/ProjectRepositoryValues.h"
+#include "transmit/SendHistory.h"
 
 #include <QDateTime>
 #include <QDirIterator>
@@ -39,6 +40,13 @@ private:
     ToolRun orb(bool withProject, const QStringList &extraEnvironment = QStringList());
     // The requests the receiver has logged since the test function began.
     QStringList requests() { return m_server->log().mid(m_logSeen).split(QLatin1Char('\n'), Qt::SkipEmptyParts); }
+    // The send history that orb records into (the test's data location).
+    static QList<CrvC_SendHistory::Entry> sent()
+    {
+        QList<CrvC_SendHistory::Entry> entries;
+        CrvC_SendHistory().entries(&entries);
+        return entries;
+    }
     QString sendIteration() const
     {
         return ProjectRepositoryValues::instance().getValue(m_projectFile,
@@ -95,10 +103,8 @@ ToolRun TestEndToEnd::orb(bool withProject, const QStringList &extraEnvironment)
     if (withProject)
         arguments << QStringLiteral("--project") << m_projectFile;
     arguments << QStringLiteral("open") << m_project + QLatin1String("/ledctrl_usage.xml");
-    const QString config = QFileInfo(Gui::Clip::Settings::userFileName()).absolutePath().chopped(4);
     return runStaged(QStringLiteral("orb"), arguments, m_env->home(),
-                     QStringList{QStringLiteral("ORB_DEBUG=1"), QLatin1String("XDG_CONFIG_HOME=") + config}
-                         + extraEnvironment);
+                     QStringList{QStringLiteral("ORB_DEBUG=1")} + Environment::locations() + extraEnvironment);
 }
 
 void TestEndToEnd::orbOpen_data()
@@ -138,6 +144,7 @@ void TestEndToEnd::orbOpen()
     if (unwritable)
         QVERIFY(QDir().mkpath(m_page));
     const int uploadsBefore = m_server->uploadFolders().size();
+    const qsizetype recordedBefore = sent().size();
 
     QElapsedTimer clock;
     clock.start();
@@ -149,6 +156,7 @@ void TestEndToEnd::orbOpen()
         QVERIFY(!QFileInfo(m_page).isFile());
         QCOMPARE(QFileInfo(m_page).isDir(), unwritable);
         QCOMPARE(requests(), QStringList());
+        QCOMPARE(sent().size(), recordedBefore);
         return;
     }
     if (countdown)
@@ -161,6 +169,15 @@ void TestEndToEnd::orbOpen()
     const QRegularExpression shown(QStringLiteral("name=\"ProjectIteration\">([^<]*)<"));
     QCOMPARE(shown.match(QString::fromUtf8(built)).captured(1), QStringLiteral("1"));
     QCOMPARE(sendIteration(), QStringLiteral("2"));
+    // One entry more in the history, sent, with the bytes the receiver
+    // stored; orb said so on its status line.
+    const QList<CrvC_SendHistory::Entry> entries = sent();
+    QCOMPARE(entries.size(), recordedBefore + 1);
+    QCOMPARE(entries.first().outcome(), QStringLiteral("sent"));
+    const ToolRun history = runStaged("corvid-history", {"show", QString::number(entries.first().id)}, m_env->home(),
+                                    Environment::locations());
+    QVERIFY(history.standardOutput == m_server->upload(uploadsBefore).file);
+    QVERIFY2(run.output.contains("orb: Usage report sent to 127.0.0.1, "), qPrintable(run.output));
 }
 
 void TestEndToEnd::emailMethodComposesWithTheReport()
@@ -205,6 +222,7 @@ void TestEndToEnd::declineSendsNothing()
         Gui::Clip::FileSupervisor::fileEditorCategory());
     QCOMPARE(editors.size(), std::size_t(1));
 
+    const qsizetype recordedBefore = sent().size();
     bool declined = false;
     QTimer::singleShot(0, this, [&] {
         QWidget *countdown = nullptr;
@@ -232,6 +250,7 @@ void TestEndToEnd::declineSendsNothing()
     QVERIFY(QFile::exists(m_page));
     QCOMPARE(requests(), QStringList());
     QCOMPARE(sendIteration(), QString());
+    QCOMPARE(sent().size(), recordedBefore);
     plugin.unload();
     OrbProject::closeCurrentProject();
 }

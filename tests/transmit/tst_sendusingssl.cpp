@@ -7,6 +7,8 @@
 #include "host/Env.h"
 #include "host/MsgManData.h"
 #include "host/Settings.h"
+#include "host/StatusLine.h"
+#include "transmit/SendHistory.h"
 #include "transmit/SendUsingSSL.h"
 #include "transmit/UserNotice.h"
 
@@ -24,6 +26,7 @@ class TestSendUsingSSL : public QObject
     QStringList m_warnings;
     QStringList m_details;
     QStringList m_offers;
+    QStringList m_status;
 
     // Sends `file` with PATH set to `path` while the lookup starts; waits
     // until the driver has deleted itself.
@@ -50,6 +53,7 @@ private Q_SLOTS:
         CrvC_UserNotice::setHandlers(
             [this](const QString &text, const QString &details) { m_warnings << text; m_details << details; },
             [this](const QString &file) { m_offers << file; });
+        Port::StatusLine::setDisplay([this](const QString &text) { m_status << text; });
         TestServer::putStageBinFirstInPath();
     }
 
@@ -59,6 +63,9 @@ private Q_SLOTS:
         m_warnings.clear();
         m_details.clear();
         m_offers.clear();
+        CrvC_SendRecorder::waitForDone(); // an earlier test's outcome is not this one's
+        QCoreApplication::processEvents();
+        m_status.clear();
         m_env->clearSettings();
         qunsetenv("CORVID_SERVER");
         qunsetenv("SSL_CERT_FILE");
@@ -180,6 +187,7 @@ private Q_SLOTS:
                                             << "The certificate of the server %1 could not be verified.";
         QTest::newRow("page without an address") << QStringList{"--no-redirect"} << false << QByteArray() << inst
                                                  << "" << 100 << "The server %1 named no upload address.";
+        // Sent again by corvid-history once the receiver is back.
         QTest::newRow("receiver stopped") << none << true << QByteArray() << inst << "" << 100
                                           << "Could not connect to %1.";
         QTest::newRow("proxy refuses") << none << false << QByteArray() << inst << "127.0.0.1:1" << 100
@@ -238,6 +246,27 @@ private Q_SLOTS:
         }
         send(file, path, proxy);
 
+        // Recorded with its bytes, and said on the status line.
+        QTRY_COMPARE_WITH_TIMEOUT(m_status.size(), 1, 30000);
+        const QString server127 = QUrl(server.baseUrl()).authority();
+        if (cause.isEmpty())
+            QVERIFY2(m_status.first().startsWith("Usage report sent to 127.0.0.1, ")
+                         && m_status.first().endsWith(" KB \u2014 Edit > Preferences > Corvid > Sent reports"),
+                     qPrintable(m_status.first()));
+        else
+            QVERIFY2(m_status.first().startsWith("Usage report not sent: "
+                                                 + (cause.contains("%1") ? cause.arg(server127) : cause)),
+                     qPrintable(m_status.first()));
+        CrvC_SendHistory history;
+        QList<CrvC_SendHistory::Entry> entries;
+        QVERIFY2(history.entries(&entries), qPrintable(history.error()));
+        QByteArray stored;
+        QVERIFY(!entries.isEmpty() && history.page(entries.first().id, &stored));
+        QVERIFY(stored == report);
+        QCOMPARE(entries.first().state(),
+                 cause.isEmpty() ? CrvC_SendHistory::State::Sent : CrvC_SendHistory::State::Failed);
+        QCOMPARE(entries.first().pending(), !cause.isEmpty());
+
         if (cause.isEmpty()) {
             QTRY_VERIFY_WITH_TIMEOUT(m_debug.join("").contains("SSL upload ended with exit status 0"), 30000);
             QVERIFY2(m_warnings.isEmpty() && m_offers.isEmpty(), qPrintable(m_debug.join("")));
@@ -248,6 +277,8 @@ private Q_SLOTS:
             QCOMPARE(upload.fields.value("domain"), CrvC_SendUsingSSL::domainName());
             QCOMPARE(upload.fields.value("regid"), QStringLiteral("Jürgen Ä, REG-9"));
             QCOMPARE(upload.fields.value("access"), QStringLiteral("v9orn"));
+            QCOMPARE(entries.first().regid, upload.fields.value("regid"));
+            QVERIFY(m_status.first().contains(reportSize == 70000 ? ", 68 KB" : ", 1 KB"));
         } else {
             QTRY_VERIFY_WITH_TIMEOUT(!m_offers.isEmpty(), 30000);
             QTest::qWait(200);
@@ -258,6 +289,21 @@ private Q_SLOTS:
             QVERIFY(details.endsWith("\nThe report was kept at " + file + "."));
             QCOMPARE(m_offers, QStringList{file});
             QCOMPARE(server.uploadFolders().size(), 0);
+        }
+        if (stopReceiver) {
+            // Back, on another port: the retry asks today's server.
+            QVERIFY2(server.start(), qPrintable(server.error()));
+            Gui::Clip::Settings("WebUpdate", true, true, true).setValue("ProxyChoice", 0);
+            const ToolRun retry = runStaged("corvid-history", {"retry", QString::number(entries.first().id)},
+                                            m_env->home(),
+                                            Environment::locations() << "CORVID_SERVER=" + server.baseUrl());
+            QVERIFY2(retry.exitCode == 0 && retry.output.startsWith("Usage report sent to 127.0.0.1"),
+                     qPrintable(QString::number(retry.exitCode) + retry.output));
+            QCOMPARE(server.uploadFolders().size(), 1);
+            QVERIFY(server.upload(0).file == report);
+            QVERIFY(history.entries(&entries));
+            QCOMPARE(entries.first().attempts.size(), 2);
+            QCOMPARE(entries.first().outcome(), QStringLiteral("sent"));
         }
     }
 

@@ -53,6 +53,7 @@ const char usage[] =
     "  -F file_loc=@FILE  The one field that names a file: the content of FILE is\n"
     "                     sent as a file upload (its base name as the file name).\n"
     "                     Without the \"@\", file_loc is text like any other field.\n"
+    "  --version          Show the versions of vancurl and of its libcurl.\n"
     "  -h, --help         Show this text.\n"
     "\n"
     "Options may come in any order; URL (http:// or https://) comes last.\n"
@@ -191,6 +192,10 @@ int main(int argc, char **argv)
         const bool last = i + 1 == argc;
         if (arg == "-h" || arg == "--help") {
             std::fputs(usage, stdout);
+            return Success;
+        }
+        if (arg == "--version") {
+            std::printf("vancurl 1.0 (libcurl %s)\n", curl_version_info(CURLVERSION_NOW)->version);
             return Success;
         }
         if (arg == "--proxy" || arg == "--cacert" || arg == "-F") {
