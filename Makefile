@@ -62,10 +62,10 @@ demo: build
 screenshots: build
 	$(BUILD_DIR)/stage/bin/corvid-screenshots --out docs/screenshots
 
-format:
+format: deps
 	$(CLANG_FORMAT) -i $(FORMAT_FILES)
 
-format-check:
+format-check: deps
 	$(CLANG_FORMAT) --dry-run --Werror $(FORMAT_FILES)
 
 clean:

@@ -28,8 +28,7 @@ const char *const RecentKey = "RecentFiles";
 
 } // namespace
 
-MainWindow::MainWindow(QWidget *parent)
-    : QMainWindow(parent)
+MainWindow::MainWindow(QWidget *parent) : QMainWindow(parent)
 {
     const QString project = Orb::currentProjectName();
     setWindowTitle(project.isEmpty() ? tr("Orb Design Environment")
@@ -110,7 +109,8 @@ void MainWindow::showAbout()
 {
     // The host links no network library: libcurl's version is vancurl's to
     // tell, the installation's own first.
-    const QString installed = QString::fromStdString(Port::VantorPath::installationRoot()) + QLatin1String("/bin/vancurl");
+    const QString installed =
+        QString::fromStdString(Port::VantorPath::installationRoot()) + QLatin1String("/bin/vancurl");
     auto *tool = new QProcess(this);
     auto show = [this, tool] {
         static const QRegularExpression libcurl(QStringLiteral("libcurl[ /]([0-9][0-9A-Za-z.+-]*)"));

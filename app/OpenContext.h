@@ -5,9 +5,7 @@
 
 // The context of an open request made from the command line: names the
 // project and the design that the opened file belongs to.
-class OpenContext : public CitP::RefObject,
-                    public GuiI::IOpenContext,
-                    public GuiI::IDesignNameProvider
+class OpenContext : public CitP::RefObject, public GuiI::IOpenContext, public GuiI::IDesignNameProvider
 {
 public:
     OpenContext(const QString &projectName, const QString &designName);

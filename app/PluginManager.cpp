@@ -19,7 +19,8 @@ PluginManager::~PluginManager()
 QStringList PluginManager::pluginDirectories()
 {
     QStringList dirs;
-    for (const QString &dir : qEnvironmentVariable("ORB_PLUGIN_PATH").split(QLatin1Char(':'), Qt::SkipEmptyParts))
+    for (const QString &dir :
+         qEnvironmentVariable("ORB_PLUGIN_PATH").split(QLatin1Char(':'), Qt::SkipEmptyParts))
         dirs << dir;
     dirs << QString::fromStdString(Port::VantorPath::installationRoot()) + QLatin1String("/lib/orb/plugins");
     return dirs;
@@ -37,8 +38,8 @@ int PluginManager::loadAll()
             auto *loader = new QPluginLoader(path);
             QObject *instance = loader->instance();
             if (!qobject_cast<Gui::Clip::CPlugin *>(instance)) {
-                std::fprintf(stderr, "orb: %s is not a plug-in of this host: %s\n",
-                             qUtf8Printable(path), qUtf8Printable(loader->errorString()));
+                std::fprintf(stderr, "orb: %s is not a plug-in of this host: %s\n", qUtf8Printable(path),
+                             qUtf8Printable(loader->errorString()));
                 loader->unload();
                 delete loader;
                 continue;

@@ -84,8 +84,7 @@ int newProject(int argc, char **argv, const QString &file, bool haveTarget,
                                 .arg(file));
         if (!OrbProject::initializeRepository(file, &error))
             return fail("", error);
-        std::printf("orb: %s: project kept; its repository holds its creation time\n",
-                    qUtf8Printable(file));
+        std::printf("orb: %s: project kept; its repository holds its creation time\n", qUtf8Printable(file));
         return 0;
     }
     if (!OrbProject::createProject(file, target, &error))
@@ -136,8 +135,7 @@ int main(int argc, char **argv)
             if (++i >= argc)
                 return fail("--project needs a project file name");
             projectFile = QString::fromLocal8Bit(argv[i]);
-        } else if (command.isEmpty()
-                   && (!std::strcmp(arg, "open") || !std::strcmp(arg, "new-project"))) {
+        } else if (command.isEmpty() && (!std::strcmp(arg, "open") || !std::strcmp(arg, "new-project"))) {
             command = QString::fromLatin1(arg);
         } else if (!command.isEmpty() && file.isEmpty() && arg[0] != '-') {
             file = QString::fromLocal8Bit(arg);

@@ -26,5 +26,5 @@ public:
     int port = -1;    // -1 for the default
     QString user;
     QString password;
-    QString options;  // further PostgreSQL connection parameters, "name=value;..."
+    QString options; // further PostgreSQL connection parameters, "name=value;..."
 };

@@ -30,8 +30,8 @@ public:
     };
     struct Item
     {
-        int group; // index into groups
-        int level; // 1 to 3 from dtag-item1 to dtag-item3
+        int group;           // index into groups
+        int level;           // 1 to 3 from dtag-item1 to dtag-item3
         QString name, value; // the item text split at its first "="
     };
     struct CommandLine
@@ -43,7 +43,8 @@ public:
     struct Run
     {
         QString tool;
-        QVariant runs, completed, failed, cancelled, totalSeconds, averageSeconds; // null when absent or no number
+        QVariant runs, completed, failed, cancelled, totalSeconds,
+            averageSeconds; // null when absent or no number
         QString lastRun;
     };
     struct HelpEntry

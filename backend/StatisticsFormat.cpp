@@ -77,9 +77,10 @@ QByteArray CrvB_StatisticsFormat::text(const CrvB_Statistics::Table &table)
 QByteArray CrvB_StatisticsFormat::csv(const CrvB_Statistics::Table &table)
 {
     auto field = [](QString text) -> QString {
-        if (text.contains(QLatin1Char(',')) || text.contains(QLatin1Char('"')) || text.contains(QLatin1Char('\n'))
-            || text.contains(QLatin1Char('\r')) || text != text.trimmed())
-            text = QLatin1Char('"') + text.replace(QLatin1Char('"'), QLatin1String("\"\"")) + QLatin1Char('"');
+        if (text.contains(QLatin1Char(',')) || text.contains(QLatin1Char('"'))
+            || text.contains(QLatin1Char('\n')) || text.contains(QLatin1Char('\r')) || text != text.trimmed())
+            text =
+                QLatin1Char('"') + text.replace(QLatin1Char('"'), QLatin1String("\"\"")) + QLatin1Char('"');
         return text;
     };
     QString out = table.columns.join(QLatin1Char(',')) + QLatin1String("\r\n");
@@ -112,8 +113,9 @@ QString CrvB_StatisticsFormat::svgChart(const CrvB_Statistics::Table &table)
     qlonglong largest = 1;
     for (int i = 0; i < shown; ++i)
         largest = qMax(largest, table.rows.at(i).at(table.chartColumn).toLongLong());
-    QString svg = QStringLiteral("<svg xmlns=\"http://www.w3.org/2000/svg\" width=\"%1\" height=\"%2\" "
-                                 "role=\"img\" aria-label=\"%3\">\n")
+    QString svg = QStringLiteral(
+                      "<svg xmlns=\"http://www.w3.org/2000/svg\" width=\"%1\" height=\"%2\" "
+                      "role=\"img\" aria-label=\"%3\">\n")
                       .arg(labelWidth + barWidth + 80)
                       .arg(shown * rowHeight + 10)
                       .arg(table.columns.at(table.chartColumn).toHtmlEscaped());
@@ -126,9 +128,10 @@ QString CrvB_StatisticsFormat::svgChart(const CrvB_Statistics::Table &table)
             name = name.left(47) + QChar(0x2026);
         const qlonglong bar = qMax<qlonglong>(1, value * barWidth / largest);
         // One arg() call: a label must not be searched for further markers.
-        svg += QStringLiteral("<text x=\"%1\" y=\"%2\" text-anchor=\"end\">%3</text>"
-                              "<rect x=\"%4\" y=\"%5\" width=\"%6\" height=\"%7\" fill=\"#3f7fbf\"/>"
-                              "<text x=\"%8\" y=\"%2\">%9</text>\n")
+        svg += QStringLiteral(
+                   "<text x=\"%1\" y=\"%2\" text-anchor=\"end\">%3</text>"
+                   "<rect x=\"%4\" y=\"%5\" width=\"%6\" height=\"%7\" fill=\"#3f7fbf\"/>"
+                   "<text x=\"%8\" y=\"%2\">%9</text>\n")
                    .arg(QString::number(labelWidth - 8), QString::number(y + 15), name.toHtmlEscaped(),
                         QString::number(labelWidth), QString::number(y + 3), QString::number(bar),
                         QString::number(rowHeight - 6), QString::number(labelWidth + bar + 6),
@@ -140,10 +143,11 @@ QString CrvB_StatisticsFormat::svgChart(const CrvB_Statistics::Table &table)
 QByteArray CrvB_StatisticsFormat::html(const CrvB_Statistics::Table &table)
 {
     const QString title = QStringLiteral("Corvid statistics: %1").arg(table.query).toHtmlEscaped();
-    QString out = QStringLiteral("<!DOCTYPE html>\n<html><head><meta charset=\"utf-8\"><title>%1</title>\n"
-                                 "<style>body{font-family:sans-serif}table{border-collapse:collapse}"
-                                 "td,th{border:1px solid #999;padding:2px 6px}td.n{text-align:right}"
-                                 "svg text{font-size:12px}</style></head>\n<body>\n<h1>%1</h1>\n")
+    QString out = QStringLiteral(
+                      "<!DOCTYPE html>\n<html><head><meta charset=\"utf-8\"><title>%1</title>\n"
+                      "<style>body{font-family:sans-serif}table{border-collapse:collapse}"
+                      "td,th{border:1px solid #999;padding:2px 6px}td.n{text-align:right}"
+                      "svg text{font-size:12px}</style></head>\n<body>\n<h1>%1</h1>\n")
                       .arg(title);
     if (table.rows.isEmpty())
         out += QLatin1String("<p>No reports.</p>\n");
@@ -156,7 +160,8 @@ QByteArray CrvB_StatisticsFormat::html(const CrvB_Statistics::Table &table)
     for (const QVariantList &row : table.rows) {
         out += QLatin1String("<tr>");
         for (int i = 0; i < row.size(); ++i)
-            out += (table.kinds.at(i) == Kind::Text ? QLatin1String("<td>") : QLatin1String("<td class=\"n\">"))
+            out +=
+                (table.kinds.at(i) == Kind::Text ? QLatin1String("<td>") : QLatin1String("<td class=\"n\">"))
                 + cell(row.at(i), table.kinds.at(i)).toHtmlEscaped() + QLatin1String("</td>");
         out += QLatin1String("</tr>\n");
     }

@@ -50,9 +50,10 @@ class RowWriter
 {
 public:
     RowWriter(const QSqlDatabase &db, const QString &table, const QStringList &columns)
-        : m_db(db), m_head(QStringLiteral("INSERT INTO %1 (report_id, %2) VALUES ")
-                               .arg(table, columns.join(QLatin1String(", ")))),
-          m_width(int(columns.size()) + 1)
+        : m_db(db)
+        , m_head(QStringLiteral("INSERT INTO %1 (report_id, %2) VALUES ")
+                     .arg(table, columns.join(QLatin1String(", "))))
+        , m_width(int(columns.size()) + 1)
     {
     }
 
@@ -70,8 +71,9 @@ public:
             for (; rows - done >= chunk; done += chunk) {
                 QSqlQuery &query = statement(chunk);
                 for (int i = 0; i < chunk * m_width; ++i)
-                    query.bindValue(placeholder(i), i % m_width == 0 ? QVariant(reportId)
-                                                                     : bindable(m_values.at(done * m_width + i)));
+                    query.bindValue(placeholder(i), i % m_width == 0
+                                                        ? QVariant(reportId)
+                                                        : bindable(m_values.at(done * m_width + i)));
                 if (!query.exec()) {
                     *error = errorText(query.lastError());
                     clear();
@@ -92,9 +94,10 @@ private:
     // QString as NULL, and a page's empty values are texts.
     static QVariant bindable(const QVariant &value)
     {
-        return value.typeId() == QMetaType::QString && static_cast<const QString *>(value.constData())->isNull()
-            ? QVariant(QLatin1String(""))
-            : value;
+        return value.typeId() == QMetaType::QString
+                       && static_cast<const QString *>(value.constData())->isNull()
+                   ? QVariant(QLatin1String(""))
+                   : value;
     }
 
     QSqlQuery &statement(int rows)
@@ -125,18 +128,21 @@ class CrvB_Store::Statements
 {
 public:
     explicit Statements(const QSqlDatabase &db)
-        : report(db), find(db), group(db, "usage_group", {"group_no", "section", "name"}),
-          item(db, "usage_item", {"item_no", "group_no", "level", "name", "value"}),
-          commandLine(db, "command_line", {"line_no", "tool", "command_line"}),
-          option(db, "command_option", {"line_no", "option_name"}),
-          run(db, "run_statistic",
-              {"row_no", "tool", "runs", "completed", "failed", "cancelled", "total_seconds", "average_seconds",
-               "last_run"}),
-          help(db, "help_entry", {"entry_no", "list", "term", "hits"}), core(db, "core", {"core_no", "core_type"}),
-          parameter(db, "core_parameter", {"parameter_no", "core_no", "name", "value"}),
-          property(db, "project_property", {"property_no", "kind", "name", "value"}),
-          sourceType(db, "source_type", {"type_no", "source_type", "files"}),
-          other(db, "page_value", {"value_no", "tag", "name", "path", "value"})
+        : report(db)
+        , find(db)
+        , group(db, "usage_group", {"group_no", "section", "name"})
+        , item(db, "usage_item", {"item_no", "group_no", "level", "name", "value"})
+        , commandLine(db, "command_line", {"line_no", "tool", "command_line"})
+        , option(db, "command_option", {"line_no", "option_name"})
+        , run(db, "run_statistic",
+              {"row_no", "tool", "runs", "completed", "failed", "cancelled", "total_seconds",
+               "average_seconds", "last_run"})
+        , help(db, "help_entry", {"entry_no", "list", "term", "hits"})
+        , core(db, "core", {"core_no", "core_type"})
+        , parameter(db, "core_parameter", {"parameter_no", "core_no", "name", "value"})
+        , property(db, "project_property", {"property_no", "kind", "name", "value"})
+        , sourceType(db, "source_type", {"type_no", "source_type", "files"})
+        , other(db, "page_value", {"value_no", "tag", "name", "path", "value"})
     {
     }
 
@@ -146,16 +152,17 @@ public:
         columns += CrvB_ReportRecord::propertyColumns().values();
         columns += {QStringLiteral("received_at"), QStringLiteral("domain"), QStringLiteral("regid"),
                     QStringLiteral("source"), QStringLiteral("ingested_at")};
-        return report.prepare(QStringLiteral("INSERT INTO report (%1) VALUES (%2) RETURNING id")
-                                  .arg(columns.join(QLatin1String(", ")),
-                                       placeholders(0, int(columns.size()))))
-            && find.prepare(QStringLiteral("SELECT 1 FROM report WHERE sha256 = ?"));
+        return report.prepare(
+                   QStringLiteral("INSERT INTO report (%1) VALUES (%2) RETURNING id")
+                       .arg(columns.join(QLatin1String(", ")), placeholders(0, int(columns.size()))))
+               && find.prepare(QStringLiteral("SELECT 1 FROM report WHERE sha256 = ?"));
     }
 
     // In the order they are written.
     QVector<RowWriter *> writers()
     {
-        return {&group, &item, &commandLine, &option, &run, &help, &core, &parameter, &property, &sourceType, &other};
+        return {&group, &item,      &commandLine, &option,     &run,  &help,
+                &core,  &parameter, &property,    &sourceType, &other};
     }
 
     QSqlQuery report, find;
@@ -186,9 +193,10 @@ QSqlDatabase CrvB_Store::database() const
 QString CrvB_Store::schema(CrvB_DatabaseUrl::Engine engine)
 {
     QString sql = QString::fromUtf8(corvidSchemaSql);
-    sql.replace(QLatin1String("REPORT_KEY"), engine == CrvB_DatabaseUrl::Engine::PostgreSQL
-                                                 ? QLatin1String("BIGINT GENERATED BY DEFAULT AS IDENTITY PRIMARY KEY")
-                                                 : QLatin1String("INTEGER PRIMARY KEY"));
+    sql.replace(QLatin1String("REPORT_KEY"),
+                engine == CrvB_DatabaseUrl::Engine::PostgreSQL
+                    ? QLatin1String("BIGINT GENERATED BY DEFAULT AS IDENTITY PRIMARY KEY")
+                    : QLatin1String("INTEGER PRIMARY KEY"));
     return sql;
 }
 
@@ -324,8 +332,8 @@ bool CrvB_Store::contains(const QByteArray &sha256, QString *error)
     return found;
 }
 
-CrvB_Store::Outcome CrvB_Store::store(const QByteArray &sha256, qint64 pageBytes, const CrvB_ReportRecord &record,
-                                      const Arrival &arrival, QString *error)
+CrvB_Store::Outcome CrvB_Store::store(const QByteArray &sha256, qint64 pageBytes,
+                                      const CrvB_ReportRecord &record, const Arrival &arrival, QString *error)
 {
     Statements &s = *m_statements;
     QSqlDatabase db = database();

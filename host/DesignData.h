@@ -191,8 +191,7 @@ public:
         static const Port::XUID id("{d7f39a05-b2c6-4e81-a05f-9e4b3d6c2a17}");
         return id;
     }
-    virtual int getPropertyTemplate(const Port::StringBase &name,
-                                    IPropertyTemplate **propertyTemplate) = 0;
+    virtual int getPropertyTemplate(const Port::StringBase &name, IPropertyTemplate **propertyTemplate) = 0;
 };
 
 // The process property UI templates of the data store.

@@ -26,8 +26,7 @@ public:
     // slot 5: opens `fileName`; `options` is reserved (0); `context` describes
     // where the open request comes from and may be null. Returns 0 when the
     // request was taken; editors that work asynchronously return 0 as well.
-    virtual int openFile(const Port::StringBase &fileName, int options,
-                         CitI::IInterface *context) = 0;
+    virtual int openFile(const Port::StringBase &fileName, int options, CitI::IInterface *context) = 0;
     // slot 6: version of this interface the editor implements (1).
     virtual int getInterfaceVersion() = 0;
     // slot 7: true when the editor can create new files.

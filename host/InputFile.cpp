@@ -9,11 +9,11 @@
 #include <limits>
 
 #ifdef Q_OS_UNIX
-#  include <cerrno>
-#  include <cstring>
-#  include <fcntl.h>
-#  include <sys/stat.h>
-#  include <unistd.h>
+#include <cerrno>
+#include <cstring>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
 #endif
 
 namespace Port {
@@ -58,13 +58,12 @@ std::atomic<qint64> replacedLimits[InputFile::KindCount];
 
 void report(const QString &path, InputFile::Kind kind, const QString &problem)
 {
-    const QString text =
-        QStringLiteral("%1 %2: %3").arg(QString::fromLatin1(info(kind).name), path, problem);
+    const QString text = QStringLiteral("%1 %2: %3").arg(QString::fromLatin1(info(kind).name), path, problem);
     Port_MsgManData::debugStub("Input refused: %s\n", text.toLocal8Bit().constData());
 }
 
 InputFile::Status refusalOf(InputFile::Status status, const QString &path, InputFile::Kind kind,
-                           const QString &problem, QString *reason)
+                            const QString &problem, QString *reason)
 {
     // Nothing there is the ordinary case of an input a project does not have.
     if (status != InputFile::Status::Missing)
@@ -125,23 +124,23 @@ InputFile::Status InputFile::open(const QString &path, Kind kind, QString *reaso
         const int error = errno;
         if (error == ENOENT || error == ENOTDIR)
             return refusalOf(Status::Missing, path, kind, QStringLiteral("no such file"), reason);
-        return refusalOf(Status::Unreadable, path, kind,
-                         QString::fromLocal8Bit(std::strerror(error)), reason);
+        return refusalOf(Status::Unreadable, path, kind, QString::fromLocal8Bit(std::strerror(error)),
+                         reason);
     }
     struct stat st;
     if (::fstat(fd, &st) != 0) {
         const int error = errno;
         ::close(fd);
-        return refusalOf(Status::Unreadable, path, kind,
-                         QString::fromLocal8Bit(std::strerror(error)), reason);
+        return refusalOf(Status::Unreadable, path, kind, QString::fromLocal8Bit(std::strerror(error)),
+                         reason);
     }
     if (!S_ISREG(st.st_mode)) {
         ::close(fd);
-        const char *what = S_ISDIR(st.st_mode)    ? "a directory"
-                           : S_ISFIFO(st.st_mode) ? "a named pipe"
-                           : S_ISSOCK(st.st_mode) ? "a socket"
+        const char *what = S_ISDIR(st.st_mode)                          ? "a directory"
+                           : S_ISFIFO(st.st_mode)                       ? "a named pipe"
+                           : S_ISSOCK(st.st_mode)                       ? "a socket"
                            : S_ISCHR(st.st_mode) || S_ISBLK(st.st_mode) ? "a device"
-                                                                         : "not a regular file";
+                                                                        : "not a regular file";
         return refusalOf(Status::NotRegular, path, kind, QString::fromLatin1(what), reason);
     }
     if (qint64(st.st_size) > m_limit) {
@@ -251,8 +250,7 @@ bool InputFile::readRest(QByteArray &bytes)
     return true;
 }
 
-InputFile::Status InputFile::readAll(const QString &path, Kind kind, QByteArray &bytes,
-                                     QString *reason)
+InputFile::Status InputFile::readAll(const QString &path, Kind kind, QByteArray &bytes, QString *reason)
 {
     bytes.clear();
     InputFile file;

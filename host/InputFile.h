@@ -96,8 +96,7 @@ public:
     // Reads the whole file; `bytes` is left empty unless the status is
     // Opened. A file that reads past its limit is refused as TooLarge, one
     // whose reading fails half-way as Unreadable.
-    static Status readAll(const QString &path, Kind kind, QByteArray &bytes,
-                          QString *reason = nullptr);
+    static Status readAll(const QString &path, Kind kind, QByteArray &bytes, QString *reason = nullptr);
 
     // True when `path` would open; nothing is read.
     static bool isAvailable(const QString &path, Kind kind);

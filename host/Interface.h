@@ -12,7 +12,7 @@ class ORBHOST_EXPORT IInterface
 {
 public:
     virtual IInterface *GetInterface(const Port::XUID &iid) = 0; // slot 0
-    virtual ~IInterface();                                      // slot 1
+    virtual ~IInterface();                                       // slot 1
 };
 
 // Reference counting of host objects. Every object handed out by the factory

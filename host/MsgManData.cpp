@@ -40,8 +40,7 @@ void deliver(const Port_MsgManData::Message &m)
         return;
     }
     if (m.kind == Port_MsgManData::Error) {
-        std::fprintf(stderr, "ERROR:%s:%s:%d: %s", m.module.c_str(), m.file.c_str(), m.line,
-                     m.text.c_str());
+        std::fprintf(stderr, "ERROR:%s:%s:%d: %s", m.module.c_str(), m.file.c_str(), m.line, m.text.c_str());
         if (m.text.empty() || m.text.back() != '\n')
             std::fputc('\n', stderr);
     } else if (debugEnabled()) {
@@ -52,8 +51,7 @@ void deliver(const Port_MsgManData::Message &m)
 
 } // namespace
 
-std::unique_ptr<Port_MsgManData> Port_MsgManData::createObject(const char *module,
-                                                               const char *file, int line,
+std::unique_ptr<Port_MsgManData> Port_MsgManData::createObject(const char *module, const char *file, int line,
                                                                const char *revision)
 {
     std::unique_ptr<Port_MsgManData> object(new Port_MsgManData);

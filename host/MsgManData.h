@@ -30,8 +30,8 @@ public:
     using Sink = std::function<void(const Message &)>;
 
     // A message object carrying the origin of the messages it issues.
-    static std::unique_ptr<Port_MsgManData> createObject(const char *module, const char *file,
-                                                         int line, const char *revision);
+    static std::unique_ptr<Port_MsgManData> createObject(const char *module, const char *file, int line,
+                                                         const char *revision);
 
     void issueError(const char *format, ...)
 #if defined(__GNUC__)

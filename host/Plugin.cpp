@@ -3,8 +3,7 @@
 namespace Gui {
 namespace Clip {
 
-CPlugin::CPlugin(QObject *parent)
-    : QObject(parent)
+CPlugin::CPlugin(QObject *parent) : QObject(parent)
 {
 }
 

@@ -31,4 +31,3 @@ public:
 
 } // namespace Clip
 } // namespace Gui
-

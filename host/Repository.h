@@ -45,7 +45,7 @@ enum OpenMode {
 };
 
 enum Status {
-    StatusFailed = 0,   // the store could not be read or written
+    StatusFailed = 0, // the store could not be read or written
     StatusOk = 1,
     StatusNotFound = 2, // no such project file, repository, section, sub-section or key
     StatusDenied = 3,   // the mode does not allow the operation
@@ -66,8 +66,7 @@ public:
 
     // Opens the sub-section `name` of this section. With a mode that writes,
     // this section must have been opened with one that writes as well.
-    virtual int openSubSection(const Port::StringBase &name, int mode,
-                               IRegSection **subSection) = 0;
+    virtual int openSubSection(const Port::StringBase &name, int mode, IRegSection **subSection) = 0;
     // Gives back a sub-section opened through this section.
     virtual void releaseSubSection(IRegSection *subSection) = 0;
 
@@ -103,8 +102,8 @@ public:
 
     // Opens `section` of the repository of `projectFile` (which must exist).
     // On success *section answers IRegSection.
-    virtual int openSection(const Port::StringBase &projectFile, const Port::StringBase &name,
-                            int mode, CitI::IInterface **section) = 0;
+    virtual int openSection(const Port::StringBase &projectFile, const Port::StringBase &name, int mode,
+                            CitI::IInterface **section) = 0;
     // Ends every section opened through this object and closes the store.
     virtual void close() = 0;
 };

@@ -17,10 +17,7 @@ QString installFileName()
 } // namespace
 
 Settings::Settings(const QString &group, bool writable, bool create, bool perUser)
-    : m_group(group)
-    , m_writable(writable && perUser)
-    , m_create(create)
-    , m_perUser(perUser)
+    : m_group(group), m_writable(writable && perUser), m_create(create), m_perUser(perUser)
 {
 }
 

@@ -11,7 +11,10 @@ namespace Clip {
 class String
 {
 public:
-    static QString convert(const Port::StringBase &s) { return QString::fromUtf8(s.c_str(), qsizetype(s.Length())); }
+    static QString convert(const Port::StringBase &s)
+    {
+        return QString::fromUtf8(s.c_str(), qsizetype(s.Length()));
+    }
     static Port::StringBase convert(const QString &s) { return Port::StringBase(s.toStdString()); }
 };
 

@@ -7,8 +7,7 @@
 
 namespace Port {
 
-StringBase::StringBase(const char *text)
-    : m_text(text ? text : "")
+StringBase::StringBase(const char *text) : m_text(text ? text : "")
 {
 }
 
@@ -44,8 +43,7 @@ StringBase &StringBase::operator+=(char c)
 
 int StringBase::Compare(const StringBase &other, bool caseSensitive) const
 {
-    return caseSensitive ? std::strcmp(c_str(), other.c_str())
-                         : strcasecmp(c_str(), other.c_str());
+    return caseSensitive ? std::strcmp(c_str(), other.c_str()) : strcasecmp(c_str(), other.c_str());
 }
 
 StringBase &StringBase::Format(const char *format, ...)

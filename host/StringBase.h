@@ -57,16 +57,25 @@ public:
     // Reads the next non-empty token at or after `pos`. On success the token's
     // bounds are stored in `begin` and `end` (end exclusive), `pos` moves past
     // the token and true is returned; false when no token is left.
-    bool NextTokenRange(const StringBase &delimiters, TokenMode mode, std::size_t &pos,
-                        std::size_t &begin, std::size_t &end) const;
+    bool NextTokenRange(const StringBase &delimiters, TokenMode mode, std::size_t &pos, std::size_t &begin,
+                        std::size_t &end) const;
 
     // Keeps only the first token delimited as in NextTokenRange; an empty result
     // when there is none.
     StringBase &Reduce(const StringBase &delimiters, TokenMode mode);
 
-    bool operator==(const StringBase &other) const { return m_text == other.m_text; }
-    bool operator!=(const StringBase &other) const { return m_text != other.m_text; }
-    bool operator<(const StringBase &other) const { return m_text < other.m_text; }
+    bool operator==(const StringBase &other) const
+    {
+        return m_text == other.m_text;
+    }
+    bool operator!=(const StringBase &other) const
+    {
+        return m_text != other.m_text;
+    }
+    bool operator<(const StringBase &other) const
+    {
+        return m_text < other.m_text;
+    }
 
 private:
     std::string m_text;

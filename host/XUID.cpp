@@ -37,9 +37,8 @@ std::string XUID::toString() const
 {
     char text[40];
     std::snprintf(text, sizeof text, "{%08x-%04x-%04x-%04x-%04x%08x}", unsigned(m_words[0]),
-                  unsigned(m_words[1] >> 16), unsigned(m_words[1] & 0xffff),
-                  unsigned(m_words[2] >> 16), unsigned(m_words[2] & 0xffff),
-                  unsigned(m_words[3]));
+                  unsigned(m_words[1] >> 16), unsigned(m_words[1] & 0xffff), unsigned(m_words[2] >> 16),
+                  unsigned(m_words[2] & 0xffff), unsigned(m_words[3]));
     return text;
 }
 

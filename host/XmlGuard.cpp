@@ -23,7 +23,8 @@ struct Layout
 Layout layoutOf(const QByteArray &head)
 {
     const auto at = [&head](int i) { return i < head.size() ? uchar(head.at(i)) : 0x100; };
-    if (at(0) == 0x00 && at(1) == 0x00 && ((at(2) == 0xFE && at(3) == 0xFF) || (at(2) == 0x00 && at(3) == 0x3C)))
+    if (at(0) == 0x00 && at(1) == 0x00
+        && ((at(2) == 0xFE && at(3) == 0xFF) || (at(2) == 0x00 && at(3) == 0x3C)))
         return {4, true};
     if ((at(0) == 0xFF && at(1) == 0xFE && at(2) == 0x00 && at(3) == 0x00)
         || (at(0) == 0x3C && at(1) == 0x00 && at(2) == 0x00 && at(3) == 0x00))
@@ -44,9 +45,11 @@ public:
     explicit PrologSource(QIODevice &device) : m_device(device), m_layout(layoutOf(device.peek(4)))
     {
         if (m_layout.width == 4)
-            m_decoder = QStringDecoder(m_layout.bigEndian ? QStringDecoder::Utf32BE : QStringDecoder::Utf32LE);
+            m_decoder =
+                QStringDecoder(m_layout.bigEndian ? QStringDecoder::Utf32BE : QStringDecoder::Utf32LE);
         else if (m_layout.width == 2)
-            m_decoder = QStringDecoder(m_layout.bigEndian ? QStringDecoder::Utf16BE : QStringDecoder::Utf16LE);
+            m_decoder =
+                QStringDecoder(m_layout.bigEndian ? QStringDecoder::Utf16BE : QStringDecoder::Utf16LE);
         else if (m_layout.utf8Mark)
             m_decoder = QStringDecoder(QStringDecoder::Utf8);
     }
@@ -135,9 +138,9 @@ bool fitsLayout(const QString &name, const Layout &layout)
         int bigEndian; // -1: either
     };
     static const Known known[] = {
-        {"UTF-8", 1, -1},     {"UTF8", 1, -1},      {"US-ASCII", 1, -1},  {"ASCII", 1, -1},
-        {"ISO-8859-1", 1, -1}, {"Latin1", 1, -1},   {"UTF-16", 2, -1},    {"UTF-16LE", 2, 0},
-        {"UTF-16BE", 2, 1},   {"UTF-32", 4, -1},    {"UTF-32LE", 4, 0},   {"UTF-32BE", 4, 1},
+        {"UTF-8", 1, -1},      {"UTF8", 1, -1},   {"US-ASCII", 1, -1}, {"ASCII", 1, -1},
+        {"ISO-8859-1", 1, -1}, {"Latin1", 1, -1}, {"UTF-16", 2, -1},   {"UTF-16LE", 2, 0},
+        {"UTF-16BE", 2, 1},    {"UTF-32", 4, -1}, {"UTF-32LE", 4, 0},  {"UTF-32BE", 4, 1},
     };
     for (const Known &k : known) {
         if (name.compare(QLatin1String(k.name), Qt::CaseInsensitive) == 0)
@@ -199,7 +202,8 @@ public:
             // characters that end them are looked at one by one.
             while (p < end) {
                 if (m_state == State::Text || m_state == State::Value) {
-                    const void *found = std::memchr(p, m_state == State::Text ? '<' : m_quote, size_t(end - p));
+                    const void *found =
+                        std::memchr(p, m_state == State::Text ? '<' : m_quote, size_t(end - p));
                     if (!found)
                         return QString();
                     p = static_cast<const uchar *>(found);
@@ -233,9 +237,9 @@ public:
 private:
     enum class State {
         Text,
-        Open,        // after '<'
-        Bang,        // after "<!"
-        BangDash,    // after "<!-"
+        Open,     // after '<'
+        Bang,     // after "<!"
+        BangDash, // after "<!-"
         Comment,
         CData,
         Declaration,
@@ -446,8 +450,7 @@ QXmlStreamReader::TokenType XmlGuard::readNext(QXmlStreamReader &reader, int &de
     return token;
 }
 
-XmlGuard::Outcome XmlGuard::open(const QString &path, InputFile::Kind kind, InputFile &file,
-                                 QString *reason)
+XmlGuard::Outcome XmlGuard::open(const QString &path, InputFile::Kind kind, InputFile &file, QString *reason)
 {
     if (file.open(path, kind, reason) != InputFile::Status::Opened)
         return Outcome::NotRead;
@@ -474,8 +477,8 @@ XmlGuard::Outcome XmlGuard::guard(InputFile &file, QString *reason)
     return Outcome::Accepted;
 }
 
-XmlGuard::Outcome XmlGuard::read(const QString &path, InputFile::Kind kind, QByteArray &xml,
-                                 int maxDepth, QString *reason)
+XmlGuard::Outcome XmlGuard::read(const QString &path, InputFile::Kind kind, QByteArray &xml, int maxDepth,
+                                 QString *reason)
 {
     xml.clear();
     InputFile file;

@@ -62,8 +62,8 @@ public:
     // For readers that take the whole document: reads it, checks its prolog,
     // its attributes and its depth (up to the first error the stream reader
     // sees). `xml` is empty unless the outcome is Accepted.
-    static Outcome read(const QString &path, InputFile::Kind kind, QByteArray &xml,
-                        int maxDepth = MaxDepth, QString *reason = nullptr);
+    static Outcome read(const QString &path, InputFile::Kind kind, QByteArray &xml, int maxDepth = MaxDepth,
+                        QString *reason = nullptr);
 
     // Why the prolog of the document is refused (an encoding declaration or
     // a markup declaration, above), or empty text when it is not. Reads

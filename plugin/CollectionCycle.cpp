@@ -37,7 +37,7 @@ QString CrvC_CollectionCycle::designName(const QString &fileName, CitI::IInterfa
     if (context) {
         auto *open = static_cast<GuiI::IOpenContext *>(context->GetInterface(GuiI::IOpenContext::iid()));
         auto *provider = open ? static_cast<GuiI::IDesignNameProvider *>(
-                                    open->GetInterface(GuiI::IDesignNameProvider::iid()))
+                             open->GetInterface(GuiI::IDesignNameProvider::iid()))
                               : nullptr;
         if (!provider)
             return QString();
@@ -63,15 +63,15 @@ void CrvC_CollectionCycle::currentProject(QString &projectFile, QString &targetF
     projectFile.clear();
     targetFamily.clear();
     auto *service = CitP::InstanceTable::GetInstance(GuiI::IProjectManager::serviceId());
-    auto *manager = service ? static_cast<GuiI::IProjectManager *>(
-                                  service->GetInterface(GuiI::IProjectManager::iid()))
-                            : nullptr;
+    auto *manager =
+        service ? static_cast<GuiI::IProjectManager *>(service->GetInterface(GuiI::IProjectManager::iid()))
+                : nullptr;
     if (manager) {
         Prjrep::AutoRelease<CitI::IInterface> project(manager->getCurrentProject());
         if (project) {
             targetFamily = String::convert(manager->getTargetFamily(project.get()));
-            if (auto *file = static_cast<Dpm::IProjectFile *>(
-                    project->GetInterface(Dpm::IProjectFile::iid())))
+            if (auto *file =
+                    static_cast<Dpm::IProjectFile *>(project->GetInterface(Dpm::IProjectFile::iid())))
                 projectFile = String::convert(file->getProjectFile());
         }
     }

@@ -28,8 +28,9 @@ void installHandlers()
 {
     CrvC_UserNotice::setHandlers(
         [](const QString &text, const QString &details) {
-            Gui::Clip::MessageBox::warning(nullptr, QCoreApplication::translate("CrvC_CorvidPlugin", "Corvid"),
-                                           text, details, QMessageBox::Ok);
+            Gui::Clip::MessageBox::warning(nullptr,
+                                           QCoreApplication::translate("CrvC_CorvidPlugin", "Corvid"), text,
+                                           details, QMessageBox::Ok);
         },
         [](const QString &reportFile) {
             CrvC_SendToClipDlg::showSendMethodDialogForEmail(nullptr, reportFile);
@@ -83,10 +84,10 @@ void removeHandlers()
 CrvC_CorvidPlugin::CrvC_CorvidPlugin()
 {
     setObjectName(QStringLiteral("CrvC_CorvidPlugin"));
-    Gui::Clip::FileSupervisor::getInstance()->registerEditor(
-        Gui::Clip::FileSupervisor::fileEditorCategory(), static_cast<GuiI::IFileEditorManager *>(this));
-    connect(QCoreApplication::instance(), SIGNAL(dataRequested(Gui::Clip::DataCollector&)),
-            this, SLOT(onDataRequested(Gui::Clip::DataCollector&)));
+    Gui::Clip::FileSupervisor::getInstance()->registerEditor(Gui::Clip::FileSupervisor::fileEditorCategory(),
+                                                             static_cast<GuiI::IFileEditorManager *>(this));
+    connect(QCoreApplication::instance(), SIGNAL(dataRequested(Gui::Clip::DataCollector &)), this,
+            SLOT(onDataRequested(Gui::Clip::DataCollector &)));
     CitP::InstanceTable::RegisterInstance(GuiI::IFileEditorManager::iid(),
                                           static_cast<GuiI::IFileEditorManager *>(this));
     installHandlers();
@@ -96,8 +97,7 @@ CrvC_CorvidPlugin::~CrvC_CorvidPlugin()
 {
     removeHandlers();
     CitP::InstanceTable::UnRegisterInstance(static_cast<GuiI::IFileEditorManager *>(this));
-    Gui::Clip::FileSupervisor::getInstance()->unregisterEditor(
-        static_cast<GuiI::IFileEditorManager *>(this));
+    Gui::Clip::FileSupervisor::getInstance()->unregisterEditor(static_cast<GuiI::IFileEditorManager *>(this));
 }
 
 CitI::IInterface *CrvC_CorvidPlugin::GetInterface(const Port::XUID &iid)
@@ -170,8 +170,7 @@ Port::StringBase CrvC_CorvidPlugin::getHelpTopic()
 
 int CrvC_CorvidPlugin::getFileSuitability(const Port::StringBase &fileName)
 {
-    return String::convert(fileName).endsWith(QLatin1String("_usage.xml")) ? PreferredEditor
-                                                                           : NotSuitable;
+    return String::convert(fileName).endsWith(QLatin1String("_usage.xml")) ? PreferredEditor : NotSuitable;
 }
 
 void CrvC_CorvidPlugin::onDataRequested(Gui::Clip::DataCollector &collector)

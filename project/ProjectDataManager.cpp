@@ -20,9 +20,12 @@ const int FileManagerErrorLine = 187;
 const int FileListErrorLine = 194;
 
 const char *const DesignProperties[] = {
-    "PROP_Synthesis_Tool",           "PROP_Simulator",
-    "PROP_Top_Level_Module_Type",    "PROP_PreferredLanguage",
-    "PROP_Enable_Message_Filtering", "PROP_Enable_Incremental_Messaging",
+    "PROP_Synthesis_Tool",
+    "PROP_Simulator",
+    "PROP_Top_Level_Module_Type",
+    "PROP_PreferredLanguage",
+    "PROP_Enable_Message_Filtering",
+    "PROP_Enable_Incremental_Messaging",
     "PROP_UseTraceHint",
 };
 
@@ -32,14 +35,10 @@ const char WorkingDirectory[] = "PROP_WorkingDirectory";
 
 // Project property whose value selects the process properties -> filter key.
 const std::pair<const char *, const char *> FilterKeys[] = {
-    {"PROP_DevFamilyPMName", "PM"},
-    {"PROP_DevDevice", "DEVICE"},
-    {"PROP_DevPackage", "PACKAGE"},
-    {"PROP_DevSpeed", "SPEED"},
-    {"PROP_Top_Level_Module_Type", "TLMT"},
-    {"PROP_Synthesis_Tool", "SYNTHESIS_TOOL"},
-    {"PROP_Simulator", "SIMULATOR_TOOL"},
-    {"PROP_PreferredLanguage", "PREFERRED_LANGUAGE"},
+    {"PROP_DevFamilyPMName", "PM"},         {"PROP_DevDevice", "DEVICE"},
+    {"PROP_DevPackage", "PACKAGE"},         {"PROP_DevSpeed", "SPEED"},
+    {"PROP_Top_Level_Module_Type", "TLMT"}, {"PROP_Synthesis_Tool", "SYNTHESIS_TOOL"},
+    {"PROP_Simulator", "SIMULATOR_TOOL"},   {"PROP_PreferredLanguage", "PREFERRED_LANGUAGE"},
 };
 
 template<typename T>
@@ -127,8 +126,7 @@ void ProjectDataManager::collectProjectProperties(PairList &pairs)
     collectProcessProperties(project, pairs);
 }
 
-bool ProjectDataManager::getDesignPropertyValue(CitI::IInterface *designData,
-                                                const Port::StringBase &name,
+bool ProjectDataManager::getDesignPropertyValue(CitI::IInterface *designData, const Port::StringBase &name,
                                                 Port::StringBase &value)
 {
     const AutoRelease<CitI::IInterface> dataStore = dataStoreOf(designData);
@@ -171,8 +169,7 @@ void ProjectDataManager::collectSourceTypes(Dpm::IProject *project, PairList &pa
     AutoRelease<CitI::IInterface> object(project ? project->getFileManager() : nullptr);
     auto *fileManager = as<Dpm::IFileManager>(object.get());
     if (!fileManager) {
-        issueError(FileManagerErrorLine,
-                   "Internal error. Error getting the file manager from theproject\n");
+        issueError(FileManagerErrorLine, "Internal error. Error getting the file manager from theproject\n");
         return;
     }
     AutoRelease<Dpm::IHdlFileIterator> files;
@@ -215,8 +212,7 @@ void ProjectDataManager::collectProcessProperties(Dpm::IProject *project, PairLi
         return;
     auto *uiStore = as<Dpm::IPropertyUITemplateStore>(dataStore.get());
     AutoRelease<Dpm::IPropertyUITemplateIterator> templates;
-    if (!uiStore
-        || uiStore->getPropertyUITemplates(as<Dpm::IFilter>(filter.get()), templates.out()) != 1
+    if (!uiStore || uiStore->getPropertyUITemplates(as<Dpm::IFilter>(filter.get()), templates.out()) != 1
         || !templates)
         return;
 

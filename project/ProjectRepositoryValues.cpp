@@ -33,25 +33,23 @@ const int ReadOnly = 1;
 // object is closed. Answers the status of the step that failed, or the one
 // `access` answered.
 template<typename Access>
-int withSubSection(const QString &projectFile, const char *section, const char *subSection,
-                   int sectionMode, int subSectionMode, Access access)
+int withSubSection(const QString &projectFile, const char *section, const char *subSection, int sectionMode,
+                   int subSectionMode, Access access)
 {
     CitP::Factory::LoadLibraryFactory(RepositoryLibrary);
     Prjrep::AutoRelease<CitI::IInterface> object(
         CitP::Factory::CreateInstance(Prjrep::IRepository::objectId()));
     if (!object)
         return Prjrep::StatusFailed;
-    auto *repository =
-        static_cast<Prjrep::IRepository *>(object->GetInterface(Prjrep::IRepository::iid()));
+    auto *repository = static_cast<Prjrep::IRepository *>(object->GetInterface(Prjrep::IRepository::iid()));
     if (!repository)
         return Prjrep::StatusFailed;
     CitI::IInterface *sectionObject = nullptr;
-    int status = repository->openSection(String::convert(projectFile), section, sectionMode,
-                                         &sectionObject);
-    auto *regSection = status == Prjrep::StatusOk && sectionObject
-                           ? static_cast<Prjrep::IRegSection *>(
-                                 sectionObject->GetInterface(Prjrep::IRegSection::iid()))
-                           : nullptr;
+    int status = repository->openSection(String::convert(projectFile), section, sectionMode, &sectionObject);
+    auto *regSection =
+        status == Prjrep::StatusOk && sectionObject
+            ? static_cast<Prjrep::IRegSection *>(sectionObject->GetInterface(Prjrep::IRegSection::iid()))
+            : nullptr;
     if (regSection) {
         Prjrep::IRegSection *sub = nullptr;
         status = regSection->openSubSection(subSection, subSectionMode, &sub);
@@ -95,8 +93,7 @@ const ProjectRepositoryValues &ProjectRepositoryValues::readOnly()
 }
 
 ProjectRepositoryValues::Lookup ProjectRepositoryValues::lookup(const QString &projectFile,
-                                                                const QString &key,
-                                                                QString *value) const
+                                                                const QString &key, QString *value) const
 {
     value->clear();
     if (projectFile.isEmpty())
@@ -120,8 +117,8 @@ int ProjectRepositoryValues::replace(const QString &projectFile, const QString &
 {
     if (!m_writes || projectFile.isEmpty())
         return Prjrep::StatusDenied;
-    return withSubSection(projectFile, CorvidSection, CorvidSubSection, ReadWriteCreate,
-                          ReadWriteCreate, [&](Prjrep::IRegSection &sub) {
+    return withSubSection(projectFile, CorvidSection, CorvidSubSection, ReadWriteCreate, ReadWriteCreate,
+                          [&](Prjrep::IRegSection &sub) {
                               const Port::StringBase old = String::convert(expected);
                               return sub.replaceValue(String::convert(key), found ? &old : nullptr,
                                                       String::convert(value));
@@ -140,10 +137,9 @@ void ProjectRepositoryValues::setValue(const QString &projectFile, const QString
 {
     if (!m_writes || projectFile.isEmpty())
         return;
-    withSubSection(projectFile, CorvidSection, CorvidSubSection, ReadWriteCreate, ReadWriteCreate,
-                   [&](Prjrep::IRegSection &sub) {
-                       return sub.setValue(String::convert(key), String::convert(value));
-                   });
+    withSubSection(
+        projectFile, CorvidSection, CorvidSubSection, ReadWriteCreate, ReadWriteCreate,
+        [&](Prjrep::IRegSection &sub) { return sub.setValue(String::convert(key), String::convert(value)); });
 }
 
 QString ProjectRepositoryValues::projectAgeInDays(const QString &projectFile) const
@@ -151,14 +147,12 @@ QString ProjectRepositoryValues::projectAgeInDays(const QString &projectFile) co
     return projectAgeInDays(projectFile, QDate::currentDate());
 }
 
-QString ProjectRepositoryValues::projectAgeInDays(const QString &projectFile,
-                                                  const QDate &today) const
+QString ProjectRepositoryValues::projectAgeInDays(const QString &projectFile, const QDate &today) const
 {
     QString stamp = QLatin1String(Uninitialized);
     if (!projectFile.isEmpty()) {
-        withSubSection(projectFile, ConsoleSection, ConsoleSubSection,
-                       m_writes ? ReadWriteCreate : ReadOnly, ReadOnly,
-                       [&](Prjrep::IRegSection &sub) {
+        withSubSection(projectFile, ConsoleSection, ConsoleSubSection, m_writes ? ReadWriteCreate : ReadOnly,
+                       ReadOnly, [&](Prjrep::IRegSection &sub) {
                            Port::StringBase text;
                            const int status = sub.getValue(CreationKey, text);
                            if (status == Prjrep::StatusOk)
@@ -174,8 +168,7 @@ QString ProjectRepositoryValues::projectAgeInDays(const QString &projectFile,
     return QString::number(created.daysTo(today));
 }
 
-QString ProjectRepositoryValues::projectIdentifier(const QString &projectFile,
-                                                  const QString &fresh) const
+QString ProjectRepositoryValues::projectIdentifier(const QString &projectFile, const QString &fresh) const
 {
     if (!fileExists(projectFile))
         return fresh;
@@ -210,8 +203,7 @@ QString ProjectRepositoryValues::sendIteration(const QString &projectFile) const
     return QString::number(number);
 }
 
-void ProjectRepositoryValues::countSend(const QString &projectFile,
-                                        const QString &shownIteration) const
+void ProjectRepositoryValues::countSend(const QString &projectFile, const QString &shownIteration) const
 {
     qlonglong shown = 0;
     if (!m_writes || !fileExists(projectFile) || !parseCounter(shownIteration, &shown))

@@ -62,8 +62,8 @@ private:
     Lookup lookup(const QString &projectFile, const QString &key, QString *value) const;
     // Stores `value` if the key still holds `expected` (absent: `found`
     // false); answers the repository's status (Prjrep::Status).
-    int replace(const QString &projectFile, const QString &key, bool found,
-                const QString &expected, const QString &value) const;
+    int replace(const QString &projectFile, const QString &key, bool found, const QString &expected,
+                const QString &value) const;
 
     const bool m_writes;
 };

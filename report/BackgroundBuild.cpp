@@ -45,8 +45,7 @@ BuildThreads buildThreads;
 } // namespace
 
 CrvC_BackgroundBuild::CrvC_BackgroundBuild(std::shared_ptr<CrvC_ReportBuilder> builder, QObject *parent)
-    : QObject(parent)
-    , m_shared(std::make_shared<Shared>())
+    : QObject(parent), m_shared(std::make_shared<Shared>())
 {
     m_shared->owner = this;
     m_shared->builder = std::move(builder);
@@ -61,12 +60,15 @@ CrvC_BackgroundBuild::CrvC_BackgroundBuild(std::shared_ptr<CrvC_ReportBuilder> b
         if (CrvC_BackgroundBuild *owner = shared->owner) {
             // Posted while the owner cannot go (it takes the lock first); an
             // owner deleted before the call runs drops it with its events.
-            QMetaObject::invokeMethod(owner, [owner] {
-                if (owner->m_abandoned)
-                    return;
-                owner->m_finished = true;
-                emit owner->finished();
-            }, Qt::QueuedConnection);
+            QMetaObject::invokeMethod(
+                owner,
+                [owner] {
+                    if (owner->m_abandoned)
+                        return;
+                    owner->m_finished = true;
+                    emit owner->finished();
+                },
+                Qt::QueuedConnection);
         } else {
             shared->builder->discardOwnCopy();
         }

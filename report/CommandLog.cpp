@@ -147,10 +147,11 @@ bool CrvC_CommandLog::checkFuseLog(const QString &path, CrvC_ReportData &data)
 
 void CrvC_CommandLog::commandLineHistorySection(const CrvC_ReportData &data, CrvC_SectionBuffer &out)
 {
-    out += QByteArrayView("&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
-                          "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD><B>Tool Usage</B></TD></TR>\n"
-                          "<TR VALIGN=TOP><TD ALIGN=LEFT>Command Line History"
-                          "<dtag-section name=\"CommandLineLog\"><UL>\n");
+    out += QByteArrayView(
+        "&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
+        "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD><B>Tool Usage</B></TD></TR>\n"
+        "<TR VALIGN=TOP><TD ALIGN=LEFT>Command Line History"
+        "<dtag-section name=\"CommandLineLog\"><UL>\n");
     for (const QString &entry : data.commandHistory) {
         out += QByteArrayView("<LI><dtag-cmdline>");
         appendEscaped(out, entry);

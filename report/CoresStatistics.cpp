@@ -51,10 +51,10 @@ bool CrvC_CoresStatistics::startElement(const QString &, const QString &, const 
     if (stringId == QLatin1String("LNKGEN_CORE_INFO")) {
         appendPair(QLatin1String(), u"Core Type", QLatin1String("dtag-core-type-name"),
                    atts.value(QLatin1String("type")));
-        appendParameters(atts, { QLatin1String("type"), QLatin1String("value"), StringIdAttribute });
+        appendParameters(atts, {QLatin1String("type"), QLatin1String("value"), StringIdAttribute});
     } else if (stringId == QLatin1String("LNKGEN_CORE_PARAMETERS")) {
-        appendParameters(atts, { StringIdAttribute, QLatin1String("value"),
-                                 QLatin1String("component_name"), QLatin1String("unregistered") });
+        appendParameters(atts, {StringIdAttribute, QLatin1String("value"), QLatin1String("component_name"),
+                                QLatin1String("unregistered")});
     }
     return true;
 }
@@ -74,10 +74,11 @@ bool CrvC_CoresStatistics::characters(const QString &)
 void CrvC_CoresStatistics::startInstance()
 {
     if (m_pairs < 0) {
-        *m_text += QByteArrayView("&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
-                  "<dtag-section name=\"CorelibStatistics\">\n"
-                  "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=4>"
-                  "<B>Core Statistics</B></TD></TR>\n");
+        *m_text += QByteArrayView(
+            "&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
+            "<dtag-section name=\"CorelibStatistics\">\n"
+            "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=4>"
+            "<B>Core Statistics</B></TD></TR>\n");
     } else {
         endInstance();
     }
@@ -118,8 +119,8 @@ void CrvC_CoresStatistics::appendParameters(const QXmlAttributes &atts,
     for (int i = 0; i < atts.count(); ++i) {
         const QString name = atts.qName(i);
         if (std::find(skipped.begin(), skipped.end(), name) == skipped.end())
-            appendPair(QLatin1String("dtag-core-param-name"), name,
-                       QLatin1String("dtag-core-param-value"), atts.value(i));
+            appendPair(QLatin1String("dtag-core-param-name"), name, QLatin1String("dtag-core-param-value"),
+                       atts.value(i));
     }
 }
 

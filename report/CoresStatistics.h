@@ -28,8 +28,7 @@ public:
     bool startDocument() override;
     bool startElement(const QString &namespaceURI, const QString &localName, const QString &qName,
                       const QXmlAttributes &atts) override;
-    bool endElement(const QString &namespaceURI, const QString &localName,
-                    const QString &qName) override;
+    bool endElement(const QString &namespaceURI, const QString &localName, const QString &qName) override;
     bool characters(const QString &ch) override;
 
     // Parses the report at `path` and writes the section to `out`: nothing
@@ -45,8 +44,7 @@ private:
     void endInstance();
     // Adds a (name, value) pair to the instance being read: its first pair
     // is the instance's title, the others stand four to a row.
-    void appendPair(QLatin1String nameTag, QStringView name, QLatin1String valueTag,
-                    QStringView value);
+    void appendPair(QLatin1String nameTag, QStringView name, QLatin1String valueTag, QStringView value);
     // Appends the attributes of `atts` as parameters, in attribute order,
     // except those named in `skipped`.
     void appendParameters(const QXmlAttributes &atts, std::initializer_list<QLatin1String> skipped);

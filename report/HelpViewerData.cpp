@@ -14,8 +14,8 @@ const QLatin1String OpenHelpFileTag("OpenHelpFile");
 
 // Appends one group of the table: its head, its entries two to a row, and
 // its end.
-void appendGroup(CrvC_SectionBuffer &text, const QList<CrvC_HelpViewerData::Entry> &entries,
-                 const char *head, const char *itemClose)
+void appendGroup(CrvC_SectionBuffer &text, const QList<CrvC_HelpViewerData::Entry> &entries, const char *head,
+                 const char *itemClose)
 {
     if (entries.isEmpty())
         return;
@@ -57,7 +57,7 @@ QString CrvC_HelpViewerData::helpFilePath()
         return QString();
     const QString version = Gui::Clip::String::convert(Port::Version::getValue("version"));
     return base + QLatin1String("/Vantor/Common/") + version.left(4)
-        + QLatin1String("/orbhelpviewerdata.xml");
+           + QLatin1String("/orbhelpviewerdata.xml");
 }
 
 bool CrvC_HelpViewerData::startDocument()
@@ -108,14 +108,14 @@ QString CrvC_HelpViewerData::sectionText() const
 
 void CrvC_HelpViewerData::writeSection(CrvC_SectionBuffer &text) const
 {
-    if (m_searchFoundList.isEmpty() && m_searchNotFoundList.isEmpty()
-        && m_openedHelpFiles.isEmpty())
+    if (m_searchFoundList.isEmpty() && m_searchNotFoundList.isEmpty() && m_openedHelpFiles.isEmpty())
         return;
 
-    text += QByteArrayView("&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
-                           "<dtag-section name=\"OrbHelpViewerData\">\n"
-                           "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=2>"
-                           "<B>Help Statistics</B></TD></TR>\n");
+    text += QByteArrayView(
+        "&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"
+        "<dtag-section name=\"OrbHelpViewerData\">\n"
+        "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=2>"
+        "<B>Help Statistics</B></TD></TR>\n");
     appendGroup(text, m_searchFoundList,
                 "<TR ALIGN=LEFT><TD COLSPAN=2><dtag-group><B>"
                 "<dtag-group-name name=\"SearchFoundList\">\n"

@@ -35,8 +35,7 @@ public:
     bool startDocument() override;
     bool startElement(const QString &namespaceURI, const QString &localName, const QString &qName,
                       const QXmlAttributes &atts) override;
-    bool endElement(const QString &namespaceURI, const QString &localName,
-                    const QString &qName) override;
+    bool endElement(const QString &namespaceURI, const QString &localName, const QString &qName) override;
     bool characters(const QString &ch) override;
 
     // Writes the section to `out` as UTF-8: nothing when nothing was read

@@ -13,8 +13,9 @@ bool isNameStart(QChar c)
 
 bool isNameChar(QChar c)
 {
-    return c.unicode() < 128 && (c.isLetterOrNumber() || c == QLatin1Char('-') || c == QLatin1Char('_')
-                                 || c == QLatin1Char(':') || c == QLatin1Char('.'));
+    return c.unicode() < 128
+           && (c.isLetterOrNumber() || c == QLatin1Char('-') || c == QLatin1Char('_') || c == QLatin1Char(':')
+               || c == QLatin1Char('.'));
 }
 
 bool endsName(QChar c, const char *stops)
@@ -89,7 +90,8 @@ qsizetype readEntity(const QString &s, qsizetype at, QString &text)
         ++semicolon;
     if (semicolon > at + 1 && semicolon < s.size() && s.at(semicolon) == QLatin1Char(';')) {
         const QString name = s.mid(at + 1, semicolon - at - 1);
-        static const struct {
+        static const struct
+        {
             const char *name;
             char16_t code;
         } named[] = {{"nbsp", 0xa0}, {"amp", '&'}, {"lt", '<'}, {"gt", '>'}, {"quot", '"'}, {"apos", '\''}};

@@ -3,17 +3,15 @@
 #include "host/String.h"
 #include "project/ProjectRepositoryValues.h"
 
-QString CrvC_ProjectStatistics::projectStatisticsSection(const QString &projectFile,
-                                                        const QDate &today,
-                                                        const ProjectRepositoryValues &values)
+QString CrvC_ProjectStatistics::projectStatisticsSection(const QString &projectFile, const QDate &today,
+                                                         const ProjectRepositoryValues &values)
 {
     ProjectDataManager::PairList rows;
     ProjectDataManager::collectProjectProperties(rows);
     return sectionText(rows, values.projectAgeInDays(projectFile, today));
 }
 
-QString CrvC_ProjectStatistics::sectionText(const ProjectDataManager::PairList &rows,
-                                            const QString &age)
+QString CrvC_ProjectStatistics::sectionText(const ProjectDataManager::PairList &rows, const QString &age)
 {
     QString text = QStringLiteral(
         "&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>\n"

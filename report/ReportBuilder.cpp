@@ -62,8 +62,7 @@ const char *const HeadingTexts[] = {
 class BusyCursor
 {
 public:
-    explicit BusyCursor(const std::function<void(bool)> &setBusy)
-        : m_setBusy(setBusy)
+    explicit BusyCursor(const std::function<void(bool)> &setBusy) : m_setBusy(setBusy)
     {
         if (m_setBusy)
             m_setBusy(true);
@@ -100,8 +99,7 @@ class ReaderPool
 {
 public:
     explicit ReaderPool(std::vector<std::function<void()>> readers)
-        : m_readers(std::move(readers))
-        , m_failures(m_readers.size())
+        : m_readers(std::move(readers)), m_failures(m_readers.size())
     {
         const int workers = qBound(1, QThread::idealThreadCount() - 1, 2);
         for (int i = 0; i < workers; ++i) {
@@ -170,9 +168,7 @@ private:
 class CrvC_ReportBuilder::PageWriter
 {
 public:
-    PageWriter(const QStringList &paths, QString &text, bool &cut)
-        : m_text(text)
-        , m_cut(cut)
+    PageWriter(const QStringList &paths, QString &text, bool &cut) : m_text(text), m_cut(cut)
     {
         m_text.clear();
         m_cut = false;
@@ -278,10 +274,11 @@ CrvC_ReportBuilder::Environment CrvC_ReportBuilder::withDefaults(Environment env
     return environment;
 }
 
-CrvC_ReportBuilder::CrvC_ReportBuilder() : CrvC_ReportBuilder(Environment()) {}
+CrvC_ReportBuilder::CrvC_ReportBuilder() : CrvC_ReportBuilder(Environment())
+{
+}
 
-CrvC_ReportBuilder::CrvC_ReportBuilder(Environment environment)
-    : m_env(withDefaults(std::move(environment)))
+CrvC_ReportBuilder::CrvC_ReportBuilder(Environment environment) : m_env(withDefaults(std::move(environment)))
 {
     m_data.reportPath = QFileInfo(projectFilePath(QString::fromLatin1(ReportFileName))).absoluteFilePath();
 }
@@ -289,9 +286,9 @@ CrvC_ReportBuilder::CrvC_ReportBuilder(Environment environment)
 QString CrvC_ReportBuilder::projectDirectory()
 {
     auto *service = CitP::InstanceTable::GetInstance(GuiI::IProjectManager::serviceId());
-    auto *manager = service ? static_cast<GuiI::IProjectManager *>(
-                                  service->GetInterface(GuiI::IProjectManager::iid()))
-                            : nullptr;
+    auto *manager =
+        service ? static_cast<GuiI::IProjectManager *>(service->GetInterface(GuiI::IProjectManager::iid()))
+                : nullptr;
     if (!manager)
         return QString();
     Prjrep::AutoRelease<CitI::IInterface> project(manager->getCurrentProject());
@@ -466,8 +463,9 @@ void CrvC_ReportBuilder::assemble(PageWriter &page)
     });
 
     page(QStringLiteral("<HTML><HEAD><TITLE>Device Usage Statistics Report</TITLE></HEAD>"));
-    page(QStringLiteral("<BODY TEXT='#000000' BGCOLOR='#FFFFFF' LINK='#0000EE' "
-                        "VLINK='#551A8B' ALINK='#FF0000'>"));
+    page(
+        QStringLiteral("<BODY TEXT='#000000' BGCOLOR='#FFFFFF' LINK='#0000EE' "
+                       "VLINK='#551A8B' ALINK='#FF0000'>"));
     page(m_heading);
     page(m_versionSection);
     readers.finish();

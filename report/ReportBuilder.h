@@ -69,8 +69,7 @@ public:
     explicit CrvC_ReportBuilder(Environment environment);
 
     // targetFamily := targetFamily, then buildReport.
-    void createReport(const QString &projectFileArg, const QString &designName,
-                      const QString &targetFamily);
+    void createReport(const QString &projectFileArg, const QString &designName, const QString &targetFamily);
 
     // Builds the page and writes it to reportPath, and the same bytes to the
     // build's own copy when the environment gives a pageFolder. The previous

@@ -18,7 +18,7 @@ struct CrvC_ReportData
     // False when the caller named no project file: projectFile is then ".orb"
     // for the page, but nothing named after it is opened.
     bool projectGiven = true;
-    QString reportPath;  // where the page is written
+    QString reportPath; // where the page is written
     QString targetFamily;
 
     // Map report: target of the design.
@@ -57,14 +57,8 @@ struct CrvC_ReportData
 class CrvC_Lines
 {
 public:
-    explicit CrvC_Lines(std::function<void(const QString &line)> take)
-        : m_take(std::move(take))
-    {
-    }
-    explicit CrvC_Lines(QStringList &list)
-        : m_take([&list](const QString &line) { list.append(line); })
-    {
-    }
+    explicit CrvC_Lines(std::function<void(const QString &line)> take) : m_take(std::move(take)) {}
+    explicit CrvC_Lines(QStringList &list) : m_take([&list](const QString &line) { list.append(line); }) {}
 
     CrvC_Lines &operator<<(const QString &line)
     {
@@ -83,15 +77,15 @@ namespace CrvC_Markup {
 // <dtag-group><dtag-group-name name="NAME">NAME</dtag-group-name>
 inline QString groupHead(const QString &name)
 {
-    return QLatin1String("<dtag-group><dtag-group-name name=\"") % name % QLatin1String("\">")
-        % name % QLatin1String("</dtag-group-name>");
+    return QLatin1String("<dtag-group><dtag-group-name name=\"") % name % QLatin1String("\">") % name
+           % QLatin1String("</dtag-group-name>");
 }
 
 // <UL>, one <LI> per item, </UL>, on lines of their own.
 inline QString itemList(const QStringList &items)
 {
     return QLatin1String("<UL>\n<LI>") % items.join(QLatin1String("</LI>\n<LI>"))
-        % QLatin1String("</LI>\n</UL>");
+           % QLatin1String("</LI>\n</UL>");
 }
 
 inline QString groupEnd()

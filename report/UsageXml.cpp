@@ -70,10 +70,7 @@ struct UsageTables
 class UsageWalker
 {
 public:
-    explicit UsageWalker(UsageTables &tables)
-        : m_tables(tables)
-    {
-    }
+    explicit UsageWalker(UsageTables &tables) : m_tables(tables) {}
 
     void startElement(QStringView tag, const QXmlStreamAttributes &attributes);
     void endElement();
@@ -89,10 +86,7 @@ private:
 
     struct Frame
     {
-        explicit Frame(Kind k)
-            : kind(k)
-        {
-        }
+        explicit Frame(Kind k) : kind(k) {}
         Kind kind;
         // Group: its name and items. Item: its name, value and level.
         QString name;
@@ -170,8 +164,8 @@ void UsageWalker::endElement()
     m_stack.pop_back();
     if (done.kind == Kind::Item) {
         currentItems().append(QLatin1String("<dtag-") % done.level % QLatin1Char('>') % done.name
-                              % QLatin1Char('=') % done.value % QLatin1String("</dtag-")
-                              % done.level % QLatin1Char('>'));
+                              % QLatin1Char('=') % done.value % QLatin1String("</dtag-") % done.level
+                              % QLatin1Char('>'));
     } else if (done.kind == Kind::Group) {
         m_groups.pop_back();
         closeGroup(done);
@@ -247,8 +241,8 @@ void appendSpreadTable(const char *title, const QMap<QString, QStringList> &tabl
                        CrvC_Lines &lines)
 {
     lines << QLatin1String("&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>")
-          << QLatin1String("<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=4><B>")
-                 % QLatin1String(title) % QLatin1String("</B></TD></TR><TR VALIGN=TOP>")
+          << QLatin1String("<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=4><B>") % QLatin1String(title)
+                 % QLatin1String("</B></TD></TR><TR VALIGN=TOP>")
           << QStringLiteral("<dtag-section name=\"ReportConfigData\">") << QStringLiteral("<TD>");
     const qint32 limit = count / 4;
     qint64 running = 0;
@@ -265,8 +259,7 @@ void appendSpreadTable(const char *title, const QMap<QString, QStringList> &tabl
         }
         lines << CrvC_Markup::groupEnd();
     }
-    lines << QStringLiteral("</TD>") << QStringLiteral("</dtag-section>")
-          << QStringLiteral("</TR></TABLE>");
+    lines << QStringLiteral("</TD>") << QStringLiteral("</dtag-section>") << QStringLiteral("</TR></TABLE>");
 }
 
 } // namespace
@@ -275,8 +268,7 @@ bool CrvC_UsageXml::readUsageXml(const QString &path, CrvC_ReportData &data)
 {
     data.usageXmlPath = path;
     Port::InputFile file;
-    if (Port::XmlGuard::open(path, Port::InputFile::UsageXml, file)
-        != Port::XmlGuard::Outcome::Accepted)
+    if (Port::XmlGuard::open(path, Port::InputFile::UsageXml, file) != Port::XmlGuard::Outcome::Accepted)
         return false;
 
     // Filled on the side: a document that turns out to be malformed, or
@@ -313,11 +305,13 @@ void CrvC_UsageXml::appendTables(const CrvC_ReportData &data, QStringList &lines
 void CrvC_UsageXml::appendTables(const CrvC_ReportData &data, CrvC_Lines &lines)
 {
     lines << QStringLiteral("&nbsp;<BR><TABLE BORDER CELLSPACING=0 WIDTH='100%'>")
-          << QStringLiteral("<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=4><B>Device Usage "
-                            "Statistics</B></TD></TR>")
-          << QStringLiteral("<TR ALIGN=CENTER BGCOLOR='#FFFF99'><TD><B>Macro Statistics</B></TD>"
-                            "<TD><B>Miscellaneous Statistics</B></TD><TD><B>Net Statistics</B>"
-                            "</TD><TD><B>Site Usage</B></TD></TR><TR VALIGN=TOP>")
+          << QStringLiteral(
+                 "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN=4><B>Device Usage "
+                 "Statistics</B></TD></TR>")
+          << QStringLiteral(
+                 "<TR ALIGN=CENTER BGCOLOR='#FFFF99'><TD><B>Macro Statistics</B></TD>"
+                 "<TD><B>Miscellaneous Statistics</B></TD><TD><B>Net Statistics</B>"
+                 "</TD><TD><B>Site Usage</B></TD></TR><TR VALIGN=TOP>")
           << CrvC_SynthesisReport::macroStatisticsCell(data);
 
     // Miscellaneous and net statistics: every "NetStatistics..." group opens
@@ -325,8 +319,7 @@ void CrvC_UsageXml::appendTables(const CrvC_ReportData &data, CrvC_Lines &lines)
     if (data.designStatistics.isEmpty()) {
         lines << QStringLiteral("<TD>&nbsp;</TD><TD>&nbsp;</TD>");
     } else {
-        lines << QStringLiteral("<dtag-section name=\"DesignStatistics\">")
-              << QStringLiteral("<TD>");
+        lines << QStringLiteral("<dtag-section name=\"DesignStatistics\">") << QStringLiteral("<TD>");
         for (auto it = data.designStatistics.cbegin(); it != data.designStatistics.cend(); ++it) {
             if (it.key().startsWith(QLatin1String("NetStatistics"), Qt::CaseInsensitive))
                 lines << CellBreak;
@@ -349,8 +342,7 @@ void CrvC_UsageXml::appendTables(const CrvC_ReportData &data, CrvC_Lines &lines)
     lines << QStringLiteral("</TR></TABLE>");
 
     if (!data.reportConfigData.isEmpty())
-        appendSpreadTable("Configuration Data", data.reportConfigData,
-                          data.reportConfigDataCount, lines);
+        appendSpreadTable("Configuration Data", data.reportConfigData, data.reportConfigDataCount, lines);
     // The pin data carry the configuration data's section name.
     if (!data.reportPinData.isEmpty())
         appendSpreadTable("Pin Data", data.reportPinData, data.reportPinDataCount, lines);

@@ -5,7 +5,6 @@
 #include "host/Version.h"
 #include "project/ProjectRepositoryValues.h"
 
-
 namespace {
 
 QString versionValue(const char *key)
@@ -41,8 +40,7 @@ QString CrvC_VersionSection::projectId(const CrvC_ReportData &data,
     return repository(environment).projectIdentifier(data.projectFileToOpen(), fresh);
 }
 
-QString CrvC_VersionSection::projectIteration(CrvC_ReportData &data,
-                                              const ProjectRepositoryValues &values)
+QString CrvC_VersionSection::projectIteration(CrvC_ReportData &data, const ProjectRepositoryValues &values)
 {
     // Looked up once: a repository that could not be read when the page was
     // made must not give the send a counter the page never showed.
@@ -80,23 +78,22 @@ QString CrvC_VersionSection::versionSection(CrvC_ReportData &data,
     static const QLatin1String rowEnd("</TR>");
     static const QLatin1String valueEnd("</dtag-property></TD>");
     const auto labelCell = [](const char *text) -> QString {
-        return QLatin1String("<TD BGCOLOR='#FFFF99'><B>") % QLatin1String(text)
-            % QLatin1String("</B></TD>");
+        return QLatin1String("<TD BGCOLOR='#FFFF99'><B>") % QLatin1String(text) % QLatin1String("</B></TD>");
     };
     const auto value = [](const char *name, const QString &text) -> QString {
-        return QLatin1String("<TD><dtag-property name=\"") % QLatin1String(name)
-            % QLatin1String("\">") % text % valueEnd;
+        return QLatin1String("<TD><dtag-property name=\"") % QLatin1String(name) % QLatin1String("\">") % text
+               % valueEnd;
     };
 
     QStringList lines;
     lines.reserve(31);
     lines << QStringLiteral("<TABLE BORDER CELLSPACING=0 WIDTH='100%'>")
-          << QStringLiteral("<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN='4'><B>Software "
-                            "Version and Target Device</B></TD></TR>");
+          << QStringLiteral(
+                 "<TR ALIGN=CENTER BGCOLOR='#99CCFF'><TD COLSPAN='4'><B>Software "
+                 "Version and Target Device</B></TD></TR>");
     lines << rowStart << labelCell("Product Version:")
-          << QLatin1String("<TD><dtag-property name=\"ProductVersion\">") % product
-                 % QLatin1Char(':') % version
-                 % QLatin1String("</dtag-property><dtag-property name=\"ProductConfiguration\"> (")
+          << QLatin1String("<TD><dtag-property name=\"ProductVersion\">") % product % QLatin1Char(':')
+                 % version % QLatin1String("</dtag-property><dtag-property name=\"ProductConfiguration\"> (")
                  % label % QLatin1Char(')') % valueEnd
           << labelCell("Target Family:") << value("TargetFamily", data.targetFamily) << rowEnd;
     lines << rowStart << labelCell("OS Platform:") << value("OSPlatform", platform)
@@ -104,13 +101,13 @@ QString CrvC_VersionSection::versionSection(CrvC_ReportData &data,
     lines << rowStart << labelCell("Project ID (random number)")
           << QLatin1String("<TD><dtag-property name=\"RandomID\">") % random
                  % QLatin1String("</dtag-property>.<dtag-property name=\"ProjectID\">") % project
-                 % QLatin1String("</dtag-property>.<dtag-property name=\"ProjectIteration\">")
-                 % iteration % valueEnd
+                 % QLatin1String("</dtag-property>.<dtag-property name=\"ProjectIteration\">") % iteration
+                 % valueEnd
           << labelCell("Target Package:") << value("TargetPackage", data.targetPackage) << rowEnd;
     lines << rowStart << labelCell("Registration ID") << value("RegistrationID", registrationId)
           << labelCell("Target Speed:") << value("TargetSpeed", data.targetSpeed) << rowEnd;
-    lines << rowStart << labelCell("Date Generated")
-          << value("Date Generated", now.toString(Qt::TextDate)) << rowEnd;
+    lines << rowStart << labelCell("Date Generated") << value("Date Generated", now.toString(Qt::TextDate))
+          << rowEnd;
     lines << QStringLiteral("</TABLE>");
     return lines.join(QLatin1Char('\n'));
 }

@@ -14,14 +14,14 @@ public:
     // identifier on first use and the project identifier of a project file
     // that has none yet. Unset hooks of `environment` get the builder's
     // defaults (CrvC_ReportBuilder::withDefaults).
-    static QString versionSection(CrvC_ReportData &data,
-                                  const CrvC_ReportBuilder::Environment &environment);
+    static QString versionSection(CrvC_ReportData &data, const CrvC_ReportBuilder::Environment &environment);
 
     // The send iteration, cached in data.projectIteration: the project's
     // stored counter when it is a base-10 integer, otherwise "1"; empty when
     // the repository cannot be read.
-    static QString projectIteration(CrvC_ReportData &data,
-                                    const ProjectRepositoryValues &values = ProjectRepositoryValues::instance());
+    static QString
+    projectIteration(CrvC_ReportData &data,
+                     const ProjectRepositoryValues &values = ProjectRepositoryValues::instance());
     // The repository accessor of a build with `environment`: read-only for a
     // preview.
     static const ProjectRepositoryValues &repository(const CrvC_ReportBuilder::Environment &environment);
@@ -29,8 +29,7 @@ public:
     // The project's identifier from the repository of data.projectFileToOpen(). A
     // project file without one gets environment.newIdentifier() stored; without
     // a project file the new identifier is used for this report only.
-    static QString projectId(const CrvC_ReportData &data,
-                             const CrvC_ReportBuilder::Environment &environment);
+    static QString projectId(const CrvC_ReportData &data, const CrvC_ReportBuilder::Environment &environment);
 
     // The user's registration text, or the build value "Registration_ID" when
     // the host has no user information.

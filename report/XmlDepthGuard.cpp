@@ -13,10 +13,7 @@ namespace {
 class DepthLimitedHandler : public QXmlContentHandler
 {
 public:
-    DepthLimitedHandler(QXmlContentHandler &target, int maxDepth)
-        : m_target(target), m_maxDepth(maxDepth)
-    {
-    }
+    DepthLimitedHandler(QXmlContentHandler &target, int maxDepth) : m_target(target), m_maxDepth(maxDepth) {}
 
     bool tooDeep() const { return m_tooDeep; }
 
@@ -27,12 +24,9 @@ public:
     {
         return m_target.startPrefixMapping(prefix, uri);
     }
-    bool endPrefixMapping(const QString &prefix) override
-    {
-        return m_target.endPrefixMapping(prefix);
-    }
-    bool startElement(const QString &namespaceURI, const QString &localName,
-                      const QString &qName, const QXmlAttributes &atts) override
+    bool endPrefixMapping(const QString &prefix) override { return m_target.endPrefixMapping(prefix); }
+    bool startElement(const QString &namespaceURI, const QString &localName, const QString &qName,
+                      const QXmlAttributes &atts) override
     {
         if (++m_depth > m_maxDepth) {
             m_tooDeep = true;
@@ -40,17 +34,13 @@ public:
         }
         return m_target.startElement(namespaceURI, localName, qName, atts);
     }
-    bool endElement(const QString &namespaceURI, const QString &localName,
-                    const QString &qName) override
+    bool endElement(const QString &namespaceURI, const QString &localName, const QString &qName) override
     {
         --m_depth;
         return m_target.endElement(namespaceURI, localName, qName);
     }
     bool characters(const QString &ch) override { return m_target.characters(ch); }
-    bool ignorableWhitespace(const QString &ch) override
-    {
-        return m_target.ignorableWhitespace(ch);
-    }
+    bool ignorableWhitespace(const QString &ch) override { return m_target.ignorableWhitespace(ch); }
     bool processingInstruction(const QString &target, const QString &data) override
     {
         return m_target.processingInstruction(target, data);
@@ -70,10 +60,8 @@ private:
 
 } // namespace
 
-CrvC_XmlDepthGuard::Outcome CrvC_XmlDepthGuard::parseFile(const QString &path,
-                                                          Port::InputFile::Kind kind,
-                                                          QXmlContentHandler &handler,
-                                                          int maxDepth)
+CrvC_XmlDepthGuard::Outcome CrvC_XmlDepthGuard::parseFile(const QString &path, Port::InputFile::Kind kind,
+                                                          QXmlContentHandler &handler, int maxDepth)
 {
     QByteArray xml;
     switch (Port::XmlGuard::read(path, kind, xml, maxDepth)) {

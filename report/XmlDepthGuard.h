@@ -29,6 +29,6 @@ public:
     // Reads the file at `path`, an input of the given kind, and parses it
     // with a QXmlSimpleReader, with `handler` as its only handler. Linear in
     // the size of the file.
-    static Outcome parseFile(const QString &path, Port::InputFile::Kind kind,
-                             QXmlContentHandler &handler, int maxDepth = Port::XmlGuard::MaxDepth);
+    static Outcome parseFile(const QString &path, Port::InputFile::Kind kind, QXmlContentHandler &handler,
+                             int maxDepth = Port::XmlGuard::MaxDepth);
 };

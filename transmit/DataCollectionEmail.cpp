@@ -5,8 +5,7 @@
 
 const char *const CrvC_DataCollectionEmail::CollectionMailbox = "usage-statistics@vantor.example";
 
-CrvC_DataCollectionEmail::CrvC_DataCollectionEmail()
-    : m_impl(new CrvC_DataCollectionUnixImpl)
+CrvC_DataCollectionEmail::CrvC_DataCollectionEmail() : m_impl(new CrvC_DataCollectionUnixImpl)
 {
 }
 

@@ -31,8 +31,8 @@ public:
     // Starts `tool` composing a message; returns once it has started
     // (true) or failed (false, reported through onProcessError when the
     // program could not be run).
-    bool send(const QString &tool, const QString &to, const QString &subject,
-              const QString &body, const QString &file);
+    bool send(const QString &tool, const QString &to, const QString &subject, const QString &body,
+              const QString &file);
 
     // False for a report path that no mail program could be given
     // unchanged: not absolute, holding a control character (a line break

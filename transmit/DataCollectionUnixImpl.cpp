@@ -16,7 +16,8 @@ QStringList CrvC_DataCollectionUnixImpl::emailTools()
     if (!m_tools.isEmpty())
         return m_tools;
 
-    const QString path = qEnvironmentVariable("PATH") + QLatin1String(":/usr/bin/:/usr/X11R6/bin/:/usr/dt/bin/");
+    const QString path =
+        qEnvironmentVariable("PATH") + QLatin1String(":/usr/bin/:/usr/X11R6/bin/:/usr/dt/bin/");
     QStringList directories;
     for (const QString &directory : path.split(QLatin1Char(':'))) {
         if (!directory.isEmpty() && QFileInfo(directory).isDir())
@@ -70,7 +71,8 @@ QString CrvC_DataCollectionUnixImpl::composeRequest(const QString &to, const QSt
     const QString attachment =
         QLatin1String("file://") + QString::fromLatin1(QUrl::toPercentEncoding(file, "/"));
     // One arg() call, so that a "%1" inside a value stays as it is.
-    return QStringLiteral("to='%1',subject='%2',body='%3',attachment='%4'").arg(to, subject, body, attachment);
+    return QStringLiteral("to='%1',subject='%2',body='%3',attachment='%4'")
+        .arg(to, subject, body, attachment);
 }
 
 bool CrvC_DataCollectionUnixImpl::isXdgEmail(const QString &tool)

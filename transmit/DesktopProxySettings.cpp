@@ -44,7 +44,8 @@ CrvC_DesktopProxySettings CrvC_DesktopProxySettings::current(const CrvC_ProxyDea
     return fromKioslaverc(kioslavercPath());
 }
 
-CrvC_DesktopProxySettings CrvC_DesktopProxySettings::fromGnome(bool *available, const CrvC_ProxyDeadline &deadline)
+CrvC_DesktopProxySettings CrvC_DesktopProxySettings::fromGnome(bool *available,
+                                                               const CrvC_ProxyDeadline &deadline)
 {
     if (available)
         *available = false;
@@ -82,8 +83,8 @@ CrvC_DesktopProxySettings CrvC_DesktopProxySettings::fromGnomeValues(const QStri
     const QString m = gsettingsValue(mode);
     if (m == QLatin1String("auto")) {
         settings.scriptUrl = gsettingsValue(autoconfigUrl);
-        settings.flags = settings.scriptUrl.isEmpty() ? CrvC_ProxySource::AutoDetect
-                                                      : CrvC_ProxySource::ScriptAddress;
+        settings.flags =
+            settings.scriptUrl.isEmpty() ? CrvC_ProxySource::AutoDetect : CrvC_ProxySource::ScriptAddress;
     } else if (m == QLatin1String("manual")) {
         const QString host = CrvC_ProxyDiscovery::hostAndPort(gsettingsValue(httpsHost));
         if (!host.isEmpty()) {

@@ -15,14 +15,12 @@ const int SliceMs = 50;
 } // namespace
 
 CrvC_ProxyDeadline::CrvC_ProxyDeadline()
-    : m_deadline(QDeadlineTimer::Forever)
-    , m_stopped(std::make_shared<std::atomic<bool>>(false))
+    : m_deadline(QDeadlineTimer::Forever), m_stopped(std::make_shared<std::atomic<bool>>(false))
 {
 }
 
 CrvC_ProxyDeadline::CrvC_ProxyDeadline(int limitMs)
-    : m_deadline(limitMs, Qt::PreciseTimer)
-    , m_stopped(std::make_shared<std::atomic<bool>>(false))
+    : m_deadline(limitMs, Qt::PreciseTimer), m_stopped(std::make_shared<std::atomic<bool>>(false))
 {
 }
 

@@ -29,8 +29,7 @@ LiveDiscoveries live;
 
 } // namespace
 
-CrvC_ProxyDiscovery::CrvC_ProxyDiscovery(QObject *parent)
-    : QObject(parent)
+CrvC_ProxyDiscovery::CrvC_ProxyDiscovery(QObject *parent) : QObject(parent)
 {
     live.objects.insert(this);
 }
@@ -49,7 +48,8 @@ void CrvC_ProxyDiscovery::start(int limitMs)
     QString proxy;
     if (storedChoice(&proxy)) {
         // Always after start() has returned, as when the system is asked.
-        QMetaObject::invokeMethod(this, [this, proxy] { finish(proxy, false); }, Qt::QueuedConnection);
+        QMetaObject::invokeMethod(
+            this, [this, proxy] { finish(proxy, false); }, Qt::QueuedConnection);
         return;
     }
 
@@ -73,7 +73,8 @@ void CrvC_ProxyDiscovery::start(int limitMs)
         // Once stopped, the object may be waiting for this thread: nothing
         // more is sent (a late answer is dropped by finish()).
         if (!deadline.isStopped())
-            QMetaObject::invokeMethod(this, [this, proxy] { finish(proxy, false); }, Qt::QueuedConnection);
+            QMetaObject::invokeMethod(
+                this, [this, proxy] { finish(proxy, false); }, Qt::QueuedConnection);
     });
     m_worker->start();
 }

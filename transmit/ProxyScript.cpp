@@ -40,20 +40,22 @@ QString CrvC_ProxyScript::evaluate(const QString &scriptFile, const QString &url
         return QString();
     }
     QByteArray output;
-    const bool answered = deadline.within(TimeLimitMs).run(program, {scriptFile, url, host}, &output, MaxAnswerBytes);
+    const bool answered =
+        deadline.within(TimeLimitMs).run(program, {scriptFile, url, host}, &output, MaxAnswerBytes);
     const QString answer = answered ? usableAnswer(output) : QString();
     if (answer.isEmpty())
         Port_MsgManData::debugStub("Proxy script: no answer from %s\n", qUtf8Printable(scriptFile));
     return answer;
 }
 
-bool CrvC_ProxyScript::download(const QString &scriptUrl, QByteArray *script, const CrvC_ProxyDeadline &deadline)
+bool CrvC_ProxyScript::download(const QString &scriptUrl, QByteArray *script,
+                                const CrvC_ProxyDeadline &deadline)
 {
     script->clear();
     if (!deadline.run(QStringLiteral("vancurl"), {scriptUrl}, script, MaxScriptBytes) || script->isEmpty()) {
         if (script->size() > MaxScriptBytes)
-            Port_MsgManData::debugStub("Proxy script: %s is larger than %lld bytes\n", qUtf8Printable(scriptUrl),
-                                       static_cast<long long>(MaxScriptBytes));
+            Port_MsgManData::debugStub("Proxy script: %s is larger than %lld bytes\n",
+                                       qUtf8Printable(scriptUrl), static_cast<long long>(MaxScriptBytes));
         else
             Port_MsgManData::debugStub("Proxy script: could not download %s\n", qUtf8Printable(scriptUrl));
         script->clear();

@@ -31,7 +31,8 @@ void startMethod(CrvC_SendDispatcher::Method method, const QString &tool, const 
     // send() returns once the program has started or its failure has been
     // shown; the program runs on by itself.
     const QString mailbox = CrvC_SendDispatcher::emailRecipient();
-    const CrvC_SendRecorder::Ticket ticket = CrvC_SendRecorder::begin(CrvC_SendHistory::Method::Email, file, mailbox);
+    const CrvC_SendRecorder::Ticket ticket =
+        CrvC_SendRecorder::begin(CrvC_SendHistory::Method::Email, file, mailbox);
     CrvC_DataCollectionEmail email;
     if (email.send(tool, mailbox, CrvC_SendDispatcher::emailSubject(), QString(), file))
         CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Handed, tool);
@@ -39,8 +40,11 @@ void startMethod(CrvC_SendDispatcher::Method method, const QString &tool, const 
         CrvC_SendRecorder::finish(
             ticket, CrvC_SendHistory::State::Failed,
             CrvC_DataCollectionEmail::canPassFile(file)
-                ? QCoreApplication::translate("CrvC_SendDispatcher", "the mail program %1 could not be started").arg(tool)
-                : QCoreApplication::translate("CrvC_SendDispatcher", "its path cannot be passed to a mail program"));
+                ? QCoreApplication::translate("CrvC_SendDispatcher",
+                                              "the mail program %1 could not be started")
+                      .arg(tool)
+                : QCoreApplication::translate("CrvC_SendDispatcher",
+                                              "its path cannot be passed to a mail program"));
 }
 
 } // namespace

@@ -76,7 +76,10 @@ QString CrvC_SendFailure::cause(const Run &run)
     case TimeLimit:
         return tr("The transfer to %1 took longer than its time limit.").arg(server);
     default:
-        return tr("The transfer to %1 failed (exit status %2): %3").arg(server).arg(run.exitStatus).arg(reason);
+        return tr("The transfer to %1 failed (exit status %2): %3")
+            .arg(server)
+            .arg(run.exitStatus)
+            .arg(reason);
     }
 }
 

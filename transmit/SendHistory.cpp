@@ -88,7 +88,8 @@ CrvC_SendHistory::State stateFromName(const QString &name)
 
 QString CrvC_SendHistory::defaultDirectory()
 {
-    return QStandardPaths::writableLocation(QStandardPaths::GenericDataLocation) + QLatin1String("/orb/corvid");
+    return QStandardPaths::writableLocation(QStandardPaths::GenericDataLocation)
+           + QLatin1String("/orb/corvid");
 }
 
 QString CrvC_SendHistory::methodName(Method method)
@@ -139,14 +140,12 @@ bool CrvC_SendHistory::Entry::pending(const QDateTime &now) const
     return retryable(now) && attempts.size() <= MaxRetries && time.addDays(RetryDays) > now;
 }
 
-CrvC_SendHistory::CrvC_SendHistory(const QString &directory)
-    : CrvC_SendHistory(directory, Limits())
+CrvC_SendHistory::CrvC_SendHistory(const QString &directory) : CrvC_SendHistory(directory, Limits())
 {
 }
 
 CrvC_SendHistory::CrvC_SendHistory(const QString &directory, Limits limits)
-    : m_directory(directory)
-    , m_limits(limits)
+    : m_directory(directory), m_limits(limits)
 {
 }
 
@@ -258,18 +257,21 @@ bool CrvC_SendHistory::open(bool create)
     if (version == SchemaVersion)
         return true;
     const bool created = run(true, [](QSqlQuery &query) {
-        return query.exec(QStringLiteral("CREATE TABLE IF NOT EXISTS entries(id INTEGER PRIMARY KEY AUTOINCREMENT, "
-                                         "time INTEGER NOT NULL, project TEXT NOT NULL, design TEXT NOT NULL, "
-                                         "method TEXT NOT NULL, destination TEXT NOT NULL, "
-                                         "domain TEXT NOT NULL, regid TEXT NOT NULL, bytes INTEGER NOT NULL, "
-                                         "sha256 TEXT NOT NULL, stored INTEGER NOT NULL)"))
-               && query.exec(QStringLiteral("CREATE TABLE IF NOT EXISTS attempts(id INTEGER PRIMARY KEY AUTOINCREMENT, "
-                                            "entry INTEGER NOT NULL, started INTEGER NOT NULL, ended INTEGER, "
-                                            "state TEXT NOT NULL, detail TEXT NOT NULL, "
-                                            "exit_status INTEGER NOT NULL, http_status INTEGER NOT NULL, "
-                                            "automatic INTEGER NOT NULL)"))
+        return query.exec(
+                   QStringLiteral("CREATE TABLE IF NOT EXISTS entries(id INTEGER PRIMARY KEY AUTOINCREMENT, "
+                                  "time INTEGER NOT NULL, project TEXT NOT NULL, design TEXT NOT NULL, "
+                                  "method TEXT NOT NULL, destination TEXT NOT NULL, "
+                                  "domain TEXT NOT NULL, regid TEXT NOT NULL, bytes INTEGER NOT NULL, "
+                                  "sha256 TEXT NOT NULL, stored INTEGER NOT NULL)"))
+               && query.exec(
+                   QStringLiteral("CREATE TABLE IF NOT EXISTS attempts(id INTEGER PRIMARY KEY AUTOINCREMENT, "
+                                  "entry INTEGER NOT NULL, started INTEGER NOT NULL, ended INTEGER, "
+                                  "state TEXT NOT NULL, detail TEXT NOT NULL, "
+                                  "exit_status INTEGER NOT NULL, http_status INTEGER NOT NULL, "
+                                  "automatic INTEGER NOT NULL)"))
                && query.exec(QStringLiteral("CREATE INDEX IF NOT EXISTS attempts_entry ON attempts(entry)"))
-               && query.exec(QStringLiteral("CREATE TABLE IF NOT EXISTS pages(entry INTEGER PRIMARY KEY, data BLOB NOT NULL)"))
+               && query.exec(QStringLiteral(
+                   "CREATE TABLE IF NOT EXISTS pages(entry INTEGER PRIMARY KEY, data BLOB NOT NULL)"))
                && query.exec(QStringLiteral("PRAGMA user_version = %1").arg(SchemaVersion));
     });
     QFile::setPermissions(file, QFile::ReadOwner | QFile::WriteOwner);
@@ -405,8 +407,8 @@ qint64 CrvC_SendHistory::addEntry(const Entry &entry, const QByteArray &page, qi
     QByteArray stored = page.size() <= m_limits.maxBytes ? qCompress(page) : QByteArray();
     if (stored.size() > m_limits.maxBytes)
         stored.clear(); // recorded, but too large to keep
-    return insert(entry, page.size(), QCryptographicHash::hash(page, QCryptographicHash::Sha256).toHex(), stored,
-                  attemptId);
+    return insert(entry, page.size(), QCryptographicHash::hash(page, QCryptographicHash::Sha256).toHex(),
+                  stored, attemptId);
 }
 
 qint64 CrvC_SendHistory::addEntry(const Entry &entry, const QString &path, qint64 *attemptId)
@@ -421,8 +423,8 @@ qint64 CrvC_SendHistory::addEntry(const Entry &entry, const QString &path, qint6
     return insert(entry, file.size(), sha.result().toHex(), QByteArray(), attemptId);
 }
 
-qint64 CrvC_SendHistory::insert(const Entry &entry, qint64 bytes, const QByteArray &sha, const QByteArray &stored,
-                                qint64 *attemptId)
+qint64 CrvC_SendHistory::insert(const Entry &entry, qint64 bytes, const QByteArray &sha,
+                                const QByteArray &stored, qint64 *attemptId)
 {
     qint64 id = 0;
     const qint64 now = msecs(entry.time.isValid() ? entry.time : QDateTime::currentDateTimeUtc());
@@ -475,12 +477,14 @@ bool CrvC_SendHistory::finishAttempt(qint64 attemptId, State state, const QStrin
                                      int httpStatus)
 {
     return run(true, [&](QSqlQuery &query) {
-        return execute(query,
-                       QStringLiteral("UPDATE attempts SET ended = ?, state = ?, detail = ?, exit_status = ?, "
-                                      "http_status = ? WHERE id = ?"),
-                       {msecs(QDateTime::currentDateTimeUtc()), stateName(state), text(detail), exitStatus, httpStatus,
-                        attemptId})
-               && (query.numRowsAffected() == 1 || fail(tr("The send history has no attempt %1").arg(attemptId), QString()));
+        return execute(
+                   query,
+                   QStringLiteral("UPDATE attempts SET ended = ?, state = ?, detail = ?, exit_status = ?, "
+                                  "http_status = ? WHERE id = ?"),
+                   {msecs(QDateTime::currentDateTimeUtc()), stateName(state), text(detail), exitStatus,
+                    httpStatus, attemptId})
+               && (query.numRowsAffected() == 1
+                   || fail(tr("The send history has no attempt %1").arg(attemptId), QString()));
     });
 }
 
@@ -488,9 +492,12 @@ bool CrvC_SendHistory::setDestination(qint64 id, const QString &destination, con
                                       const QString &regid)
 {
     return run(true, [&](QSqlQuery &query) {
-        return execute(query, QStringLiteral("UPDATE entries SET destination = ?, domain = ?, regid = ? WHERE id = ?"),
-                       {text(destination), text(domain), text(regid), id})
-               && (query.numRowsAffected() == 1 || fail(tr("The send history has no entry %1").arg(id), QString()));
+        return execute(
+                   query,
+                   QStringLiteral("UPDATE entries SET destination = ?, domain = ?, regid = ? WHERE id = ?"),
+                   {text(destination), text(domain), text(regid), id})
+               && (query.numRowsAffected() == 1
+                   || fail(tr("The send history has no entry %1").arg(id), QString()));
     });
 }
 
@@ -573,7 +580,8 @@ bool CrvC_SendHistory::clear()
     if (m_connection.isEmpty())
         return true; // nothing was ever recorded
     const bool cleared = run(true, [](QSqlQuery &query) {
-        return query.exec(QStringLiteral("DELETE FROM pages")) && query.exec(QStringLiteral("DELETE FROM attempts"))
+        return query.exec(QStringLiteral("DELETE FROM pages"))
+               && query.exec(QStringLiteral("DELETE FROM attempts"))
                && query.exec(QStringLiteral("DELETE FROM entries"));
     });
     if (cleared)

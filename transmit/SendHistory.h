@@ -50,7 +50,7 @@ public:
         QDateTime started;
         QDateTime ended; // invalid while sending
         State state = State::Sending;
-        QString detail;     // the server's answer, the cause of a failure, or the mail program
+        QString detail;      // the server's answer, the cause of a failure, or the mail program
         int exitStatus = -1; // vancurl's, -1 when it did not run to an end
         int httpStatus = 0;  // 0 when no HTTP status is known
         bool automatic = false;

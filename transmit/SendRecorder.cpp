@@ -60,7 +60,8 @@ QThreadPool &worker()
 
 void logFailure(const CrvC_SendHistory &history)
 {
-    Port_MsgManData::debugStub("Corvid ERROR: the send is not recorded: %s\n", qUtf8Printable(history.error()));
+    Port_MsgManData::debugStub("Corvid ERROR: the send is not recorded: %s\n",
+                               qUtf8Printable(history.error()));
 }
 
 QString tr(const char *text)
@@ -70,7 +71,8 @@ QString tr(const char *text)
 
 } // namespace
 
-void CrvC_SendRecorder::noteOrigin(const QString &reportFile, const QString &projectFile, const QString &design)
+void CrvC_SendRecorder::noteOrigin(const QString &reportFile, const QString &projectFile,
+                                   const QString &design)
 {
     QList<Origin> &list = origins();
     for (qsizetype i = list.size() - 1; i >= 0; --i) {

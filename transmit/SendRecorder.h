@@ -43,7 +43,8 @@ public:
 
     // A send of the page at `reportFile` begins: its bytes are recorded as
     // a new entry. `destination` is the server (upload) or the mailbox.
-    static Ticket begin(CrvC_SendHistory::Method method, const QString &reportFile, const QString &destination);
+    static Ticket begin(CrvC_SendHistory::Method method, const QString &reportFile,
+                        const QString &destination);
     // The upload goes to `address` with these form fields beside the page.
     static void uploadStarted(const Ticket &ticket, const QString &address, const QString &domain,
                               const QString &regid);

@@ -135,7 +135,9 @@ void CrvC_SendRetry::retry(qint64 id, Done done)
             if (!history.entry(id, &entry)) {
                 *error = history.error();
             } else if (!entry.retryable()) {
-                *error = tr("report %1 is not a failed upload with its page kept (%2)").arg(id).arg(entry.outcome());
+                *error = tr("report %1 is not a failed upload with its page kept (%2)")
+                             .arg(id)
+                             .arg(entry.outcome());
             } else if (const qint64 attemptId = history.addAttempt(id, false)) {
                 prepare(history, id, attemptId, prepared.get(), error.get());
             } else {

@@ -76,15 +76,11 @@ std::shared_ptr<QEventLoopLocker> keepApplicationAlive()
 
 } // namespace
 
-CrvC_SendUsingSSL::CrvC_SendUsingSSL()
-    : QObject(nullptr)
-    , m_proxyKnown(false)
+CrvC_SendUsingSSL::CrvC_SendUsingSSL() : QObject(nullptr), m_proxyKnown(false)
 {
 }
 
-CrvC_SendUsingSSL::CrvC_SendUsingSSL(const QString &proxy)
-    : QObject(nullptr)
-    , m_proxy(proxy)
+CrvC_SendUsingSSL::CrvC_SendUsingSSL(const QString &proxy) : QObject(nullptr), m_proxy(proxy)
 {
 }
 
@@ -98,7 +94,8 @@ QString CrvC_SendUsingSSL::caBundlePath()
     const QString named = qEnvironmentVariable("SSL_CERT_FILE");
     if (!named.isEmpty() && QFileInfo(named).isFile())
         return named;
-    return QFileInfo(QLatin1String(SystemCaBundle)).isFile() ? QString::fromLatin1(SystemCaBundle) : QString();
+    return QFileInfo(QLatin1String(SystemCaBundle)).isFile() ? QString::fromLatin1(SystemCaBundle)
+                                                             : QString();
 }
 
 QString CrvC_SendUsingSSL::redirectUrl()
@@ -119,17 +116,18 @@ QStringList CrvC_SendUsingSSL::redirectArguments() const
 QStringList CrvC_SendUsingSSL::uploadArguments(const QString &url) const
 {
     return connectionArguments(m_proxy)
-           << QStringLiteral("-F") << QLatin1String("file_loc=@") + m_reportFile
-           << QStringLiteral("-F") << QLatin1String("domain=") + domainName()
-           << QStringLiteral("-F") << QLatin1String("regid=") + registrationId()
-           << QStringLiteral("-F") << QLatin1String("access=") + QLatin1String(AccessCode) << url;
+           << QStringLiteral("-F") << QLatin1String("file_loc=@") + m_reportFile << QStringLiteral("-F")
+           << QLatin1String("domain=") + domainName() << QStringLiteral("-F")
+           << QLatin1String("regid=") + registrationId() << QStringLiteral("-F")
+           << QLatin1String("access=") + QLatin1String(AccessCode) << url;
 }
 
 void CrvC_SendUsingSSL::SendFile(const QString &file)
 {
     // Recorded before anything is looked up or sent.
     if (!m_ticket)
-        m_ticket = CrvC_SendRecorder::begin(CrvC_SendHistory::Method::Upload, file, CrvC_MakerServer::baseUrl());
+        m_ticket =
+            CrvC_SendRecorder::begin(CrvC_SendHistory::Method::Upload, file, CrvC_MakerServer::baseUrl());
     if (!m_proxyKnown) {
         // The proxy is found in the background (it may take seconds); the
         // send goes on with its answer.
@@ -165,7 +163,8 @@ void CrvC_SendUsingSSL::SendFile(const QString &file)
             QTimer::singleShot(0, this, &CrvC_SendUsingSSL::lookupFailedToStart);
     });
     connect(m_lookupProcess, &QProcess::readyReadStandardOutput, this, [this] {
-        if (m_lookupProcess->bytesAvailable() > MaxLookupAnswer && m_lookupProcess->state() == QProcess::Running) {
+        if (m_lookupProcess->bytesAvailable() > MaxLookupAnswer
+            && m_lookupProcess->state() == QProcess::Running) {
             Port_MsgManData::debugStub("Corvid ERROR: the address lookup answered more than %lld bytes.\n",
                                        static_cast<long long>(MaxLookupAnswer));
             m_lookupProcess->kill(); // finished follows, as a failed lookup
@@ -258,7 +257,8 @@ void CrvC_SendUsingSSL::startUpload(const QString &address)
                 Port_MsgManData::debugStub("Corvid: SSL upload ended with exit status %d: %s\n",
                                            ended.exitStatus, answer.constData());
                 if (ended.exitStatus == 0) {
-                    CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Sent, QString::fromUtf8(answer), 0);
+                    CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Sent,
+                                              QString::fromUtf8(answer), 0);
                 } else {
                     Port_MsgManData::debugStub("Corvid ERROR: SSL upload failed: %s\n",
                                                qUtf8Printable(ended.reason));
@@ -295,7 +295,8 @@ int CrvC_SendUsingSSL::exitStatusOf(const QProcess *process)
     return process->exitStatus() == QProcess::NormalExit ? process->exitCode() : -1;
 }
 
-void CrvC_SendUsingSSL::reportFailure(const CrvC_SendRecorder::Ticket &ticket, const CrvC_SendFailure::Run &run)
+void CrvC_SendUsingSSL::reportFailure(const CrvC_SendRecorder::Ticket &ticket,
+                                      const CrvC_SendFailure::Run &run)
 {
     CrvC_SendRecorder::finish(ticket, CrvC_SendHistory::State::Failed, CrvC_SendFailure::cause(run),
                               run.started ? run.exitStatus : -1, httpStatusIn(run.reason));

@@ -27,12 +27,12 @@ class CrvC_SendUsingSSL : public QObject
 {
     Q_OBJECT
 public:
-    static const char *const ProgramName;  // "vancurl", found through PATH
-    static const char *const AccessCode;   // the upload form's fixed access code
-    static const char *const RedirectPath; // path and query of the redirect service
-    static const char *const CaBundle;     // data file with the trusted authorities
+    static const char *const ProgramName;    // "vancurl", found through PATH
+    static const char *const AccessCode;     // the upload form's fixed access code
+    static const char *const RedirectPath;   // path and query of the redirect service
+    static const char *const CaBundle;       // data file with the trusted authorities
     static const char *const SystemCaBundle; // the system's trust store (Debian's ca-certificates)
-    static const char *const FailureText;  // the warning after a failed send
+    static const char *const FailureText;    // the warning after a failed send
 
     // Finds the proxy with CrvC_ProxyDiscovery when SendFile is called, in
     // the background; the lookup starts with its answer.

@@ -67,8 +67,7 @@ QString canonicalName(const char *host, const CrvC_ProxyDeadline &deadline)
 
 } // namespace
 
-CrvC_SystemProxySource::CrvC_SystemProxySource(const CrvC_ProxyDeadline &deadline)
-    : m_deadline(deadline)
+CrvC_SystemProxySource::CrvC_SystemProxySource(const CrvC_ProxyDeadline &deadline) : m_deadline(deadline)
 {
 }
 
@@ -174,7 +173,8 @@ QString CrvC_SystemProxySource::fullyQualifiedName(const CrvC_ProxyDeadline &dea
     return canonical.isEmpty() ? QString::fromLocal8Bit(host) : canonical;
 }
 
-QString CrvC_SystemProxySource::scriptAnswer(const QString &scriptUrl, const CrvC_ProxyDeadline &deadline) const
+QString CrvC_SystemProxySource::scriptAnswer(const QString &scriptUrl,
+                                             const CrvC_ProxyDeadline &deadline) const
 {
     if (scriptUrl.isEmpty())
         return QString();

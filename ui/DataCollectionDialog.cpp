@@ -97,8 +97,8 @@ CrvC_DataCollectionDialog::CrvC_DataCollectionDialog(QWidget *parent, const char
         m_helpViewer->setSource(QUrl::fromLocalFile(help));
     else
         m_helpViewer->setText(
-            tr("The HTML page containing the Help for the Corvid feature is missing. Please go ")
-            + infoPage + tr(" for more information."));
+            tr("The HTML page containing the Help for the Corvid feature is missing. Please go ") + infoPage
+            + tr(" for more information."));
 
     m_tabWidget = new QTabWidget(this);
     m_tabWidget->setMinimumSize(600, 550);
@@ -243,8 +243,9 @@ QString CrvC_DataCollectionDialog::contentsSource(const QString &page, bool *cut
     if (cut)
         *cut = length < page.size();
     return QLatin1String("<P><B>")
-           + tr("Some of the text of this page would not show in its formatted view. Below is the page as "
-                "it is sent, mark-up included.")
+           + tr(
+               "Some of the text of this page would not show in its formatted view. Below is the page as "
+               "it is sent, mark-up included.")
            + QLatin1String("</B></P>") + (length < page.size() ? cutNotice() : QString())
            + QLatin1String("<PRE STYLE='white-space: pre-wrap'>") + page.left(length).toHtmlEscaped()
            + QLatin1String("</PRE>");

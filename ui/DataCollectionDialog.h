@@ -52,14 +52,12 @@ public:
     // Builds the report of `projectFile` and `designName` (asking the user
     // for the design name when it is empty), writes it to reportPath() and
     // shows it in the Contents tab.
-    void createReport(const QString &projectFile, const QString &designName,
-                      const QString &targetFamily);
+    void createReport(const QString &projectFile, const QString &designName, const QString &targetFamily);
     // The same in the background: asks for the design name when it is empty
     // and the host for its values, here, then reads the files and writes
     // the page on a thread of its own; reportFinished() follows. False when
     // nothing is built (the prompt cancelled); nothing follows then.
-    bool startReport(const QString &projectFile, const QString &designName,
-                     const QString &targetFamily);
+    bool startReport(const QString &projectFile, const QString &designName, const QString &targetFamily);
     // False while a build started by startReport() runs.
     bool reportReady() const;
 

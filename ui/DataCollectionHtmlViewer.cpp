@@ -1,7 +1,6 @@
 #include "DataCollectionHtmlViewer.h"
 
-CrvC_DataCollectionHtmlViewer::CrvC_DataCollectionHtmlViewer(QWidget *parent)
-    : QTextBrowser(parent)
+CrvC_DataCollectionHtmlViewer::CrvC_DataCollectionHtmlViewer(QWidget *parent) : QTextBrowser(parent)
 {
     setFrameStyle(QFrame::Panel | QFrame::Sunken);
     QPalette colours = palette();

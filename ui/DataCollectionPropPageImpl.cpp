@@ -23,7 +23,8 @@ CrvC_DataCollectionPropPageImpl::CrvC_DataCollectionPropPageImpl(QWidget *parent
     vboxLayout->insertWidget(vboxLayout->indexOf(collectionCheckBox) + 1, m_administratorNote);
     connect(sslRadioButton, &QAbstractButton::toggled, this,
             &CrvC_DataCollectionPropPageImpl::OnSSLButtonStateChanged);
-    connect(sentReportsButton, &QAbstractButton::clicked, this, &CrvC_DataCollectionPropPageImpl::showSentReports);
+    connect(sentReportsButton, &QAbstractButton::clicked, this,
+            &CrvC_DataCollectionPropPageImpl::showSentReports);
 }
 
 CrvC_DataCollectionPropPageImpl::~CrvC_DataCollectionPropPageImpl() = default;
@@ -61,8 +62,8 @@ void CrvC_DataCollectionPropPageImpl::loadPage()
         selectEmailTool->addItem(tool, tool);
     selectEmailTool->setCurrentIndex(selectEmailTool->count() - 1);
     if (!m_loaded.emailTool.isEmpty()) {
-        const int found = selectEmailTool->findText(m_loaded.emailTool,
-                                                    Qt::MatchExactly | Qt::MatchCaseSensitive);
+        const int found =
+            selectEmailTool->findText(m_loaded.emailTool, Qt::MatchExactly | Qt::MatchCaseSensitive);
         if (found >= 0)
             selectEmailTool->setCurrentIndex(found);
     }

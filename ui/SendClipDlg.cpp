@@ -10,8 +10,8 @@
 #include <QTimer>
 #include <QVariant>
 
-CrvC_SendClipDlg::CrvC_SendClipDlg(QWidget *parent, const QString &projectFile,
-                                   const QString &designName, const QString &targetFamily)
+CrvC_SendClipDlg::CrvC_SendClipDlg(QWidget *parent, const QString &projectFile, const QString &designName,
+                                   const QString &targetFamily)
     : Gui::Clip::Dialog(parent, nullptr, "Corvid_SendDlg", false)
 {
     setAttribute(Qt::WA_DeleteOnClose);

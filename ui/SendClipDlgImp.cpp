@@ -1,7 +1,6 @@
 #include "SendClipDlgImp.h"
 
-CrvC_SendClipDlgImp::CrvC_SendClipDlgImp()
-    : QWidget(nullptr)
+CrvC_SendClipDlgImp::CrvC_SendClipDlgImp() : QWidget(nullptr)
 {
     setupUi(this);
 }

@@ -164,10 +164,11 @@ void CrvC_SendHistoryDialog::onSelectionChanged()
     if (!entry->domain.isEmpty() || !entry->regid.isEmpty())
         details += tr("\nForm fields: domain=%1, regid=%2").arg(entry->domain, entry->regid);
     for (const CrvC_SendHistory::Attempt &attempt : entry->attempts)
-        details += tr("\n%1  %2%3")
-                       .arg(attempt.started.toLocalTime().toString(QStringLiteral("yyyy-MM-dd HH:mm:ss")),
-                            CrvC_SendHistory::stateName(attempt.state),
-                            attempt.detail.isEmpty() ? QString() : QLatin1String(": ") + attempt.detail.left(200));
+        details +=
+            tr("\n%1  %2%3")
+                .arg(attempt.started.toLocalTime().toString(QStringLiteral("yyyy-MM-dd HH:mm:ss")),
+                     CrvC_SendHistory::stateName(attempt.state),
+                     attempt.detail.isEmpty() ? QString() : QLatin1String(": ") + attempt.detail.left(200));
     m_details->setText(details);
     if (entry->id == m_shownId)
         return;

@@ -45,7 +45,8 @@ CrvC_SendToClipDlg::CrvC_SendToClipDlg(QWidget *parent, const QString &reportFil
         m_imp->emailRadioButton->setToolTip(m_noEmailToolNote->text());
         m_imp->sslRadioButton->setChecked(true);
     }
-    const int found = m_imp->selectEmailTool->findText(stored.emailTool, Qt::MatchExactly | Qt::MatchCaseSensitive);
+    const int found =
+        m_imp->selectEmailTool->findText(stored.emailTool, Qt::MatchExactly | Qt::MatchCaseSensitive);
     if (!stored.emailTool.isEmpty() && found >= 0)
         m_imp->selectEmailTool->setCurrentIndex(found);
 

@@ -1,7 +1,6 @@
 #include "SendToClipDlgImp.h"
 
-CrvC_SendToClipDlgImp::CrvC_SendToClipDlgImp()
-    : QWidget(nullptr)
+CrvC_SendToClipDlgImp::CrvC_SendToClipDlgImp() : QWidget(nullptr)
 {
     setupUi(this);
 }

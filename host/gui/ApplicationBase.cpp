@@ -7,8 +7,7 @@
 namespace Gui {
 namespace Clip {
 
-ApplicationBase::ApplicationBase(int &argc, char **argv)
-    : QApplication(argc, argv)
+ApplicationBase::ApplicationBase(int &argc, char **argv) : QApplication(argc, argv)
 {
 }
 

@@ -8,10 +8,7 @@ namespace Clip {
 
 PropItem::PropItem(const QString &name, const QString &title, const QString &subTitle,
                    const char *internalName)
-    : m_name(name)
-    , m_title(title)
-    , m_subTitle(subTitle)
-    , m_internalName(internalName)
+    : m_name(name), m_title(title), m_subTitle(subTitle), m_internalName(internalName)
 {
 }
 
@@ -53,8 +50,7 @@ QWidget *PropItem::createPage(QWidget *container)
     PropItem *self = this;
     const QList<QByteArray> types = method.parameterTypes();
     const int before = container->findChildren<QWidget *>(QString(), Qt::FindDirectChildrenOnly).size();
-    method.invoke(m_creator, Qt::DirectConnection,
-                  QGenericArgument(types.at(0).constData(), &container),
+    method.invoke(m_creator, Qt::DirectConnection, QGenericArgument(types.at(0).constData(), &container),
                   QGenericArgument(types.at(1).constData(), &self));
     const QList<QWidget *> children =
         container->findChildren<QWidget *>(QString(), Qt::FindDirectChildrenOnly);

@@ -19,8 +19,7 @@ class PropSheet;
 class ORBHOSTGUI_EXPORT PropItem
 {
 public:
-    PropItem(const QString &name, const QString &title, const QString &subTitle,
-             const char *internalName);
+    PropItem(const QString &name, const QString &title, const QString &subTitle, const char *internalName);
     ~PropItem();
 
     QString name() const { return m_name; }

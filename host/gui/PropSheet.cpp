@@ -16,14 +16,12 @@ namespace Gui {
 namespace Clip {
 
 PropSheet::PropSheet(QWidget *parent)
-    : QDialog(parent)
-    , m_list(new QListWidget(this))
-    , m_pages(new QStackedWidget(this))
+    : QDialog(parent), m_list(new QListWidget(this)), m_pages(new QStackedWidget(this))
 {
     setWindowTitle(tr("Preferences"));
     m_list->setMaximumWidth(200);
-    auto *buttons = new QDialogButtonBox(
-        QDialogButtonBox::Ok | QDialogButtonBox::Apply | QDialogButtonBox::Cancel, this);
+    auto *buttons =
+        new QDialogButtonBox(QDialogButtonBox::Ok | QDialogButtonBox::Apply | QDialogButtonBox::Cancel, this);
     connect(buttons, &QDialogButtonBox::accepted, this, &PropSheet::accept);
     connect(buttons, &QDialogButtonBox::rejected, this, &PropSheet::reject);
     connect(buttons->button(QDialogButtonBox::Apply), &QPushButton::clicked, this, &PropSheet::apply);

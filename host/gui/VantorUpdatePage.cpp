@@ -74,7 +74,8 @@ VantorUpdatePage::VantorUpdatePage(QWidget *parent)
 
     auto *layout = new QVBoxLayout(this);
     auto *note = new QLabel(tr("Usage reports and updates reach Vantor's web site through this "
-                               "proxy."), this);
+                               "proxy."),
+                            this);
     note->setWordWrap(true);
     layout->addWidget(note);
     layout->addWidget(group);
@@ -88,13 +89,13 @@ void VantorUpdatePage::addTo(PropSheet *sheet)
 {
     if (!sheet)
         return;
-    auto *item = new PropItem(QString::fromLatin1(ItemName), tr("VantorUpdate"),
-                              tr("Proxy settings for connections to Vantor's web site"),
-                              "orb-vantorupdate-pref-item");
+    auto *item =
+        new PropItem(QString::fromLatin1(ItemName), tr("VantorUpdate"),
+                     tr("Proxy settings for connections to Vantor's web site"), "orb-vantorupdate-pref-item");
     // The sheet owns the item; the creator goes with the sheet.
     auto *creator = new Creator;
     creator->setParent(sheet);
-    item->setPropPageCreator(creator, SLOT(OnCreatePrefPage(QWidget*,Gui::Clip::PropItem*)));
+    item->setPropPageCreator(creator, SLOT(OnCreatePrefPage(QWidget *, Gui::Clip::PropItem *)));
     item->setHelpFileNameAndTopic(ApplicationBase::getHelpFileName(), QStringLiteral("orb-vantorupdate"));
     sheet->addItem(item, false, 1);
 }

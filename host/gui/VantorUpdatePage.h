@@ -26,7 +26,7 @@ class ORBHOSTGUI_EXPORT VantorUpdatePage : public QWidget
 public:
     enum ProxyChoice { NoProxy = 0, SystemProxy = 1, ManualProxy = 2 };
 
-    static const char *const Group; // "WebUpdate"
+    static const char *const Group;    // "WebUpdate"
     static const char *const ItemName; // "VantorUpdate"
 
     explicit VantorUpdatePage(QWidget *parent = nullptr);

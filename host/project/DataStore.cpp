@@ -135,10 +135,7 @@ private:
 class PropertyUITemplate : public HostObject<Dpm::IPropertyUITemplate>
 {
 public:
-    PropertyUITemplate(ModelPointer model, qsizetype index)
-        : m_model(std::move(model)), m_index(index)
-    {
-    }
+    PropertyUITemplate(ModelPointer model, qsizetype index) : m_model(std::move(model)), m_index(index) {}
 
     bool isExcluded() override { return property().excluded; }
     Port::StringBase getId() override { return String::convert(property().id); }
@@ -203,8 +200,8 @@ bool applies(const ProjectDocument::ProcessProperty &property, Dpm::IFilter *fil
     return true;
 }
 
-class DataStore : public HostObject<Dpm::IDataStore, Dpm::IPropertyTemplateStore,
-                                    Dpm::IPropertyUITemplateStore>
+class DataStore
+    : public HostObject<Dpm::IDataStore, Dpm::IPropertyTemplateStore, Dpm::IPropertyUITemplateStore>
 {
 public:
     explicit DataStore(ModelPointer model) : m_model(std::move(model)) {}
@@ -217,8 +214,7 @@ public:
         return 1;
     }
 
-    int getPropertyTemplate(const Port::StringBase &name,
-                            Dpm::IPropertyTemplate **propertyTemplate) override
+    int getPropertyTemplate(const Port::StringBase &name, Dpm::IPropertyTemplate **propertyTemplate) override
     {
         if (!propertyTemplate)
             return 0;
@@ -239,8 +235,7 @@ public:
         return 0;
     }
 
-    int getPropertyUITemplates(Dpm::IFilter *filter,
-                               Dpm::IPropertyUITemplateIterator **templates) override
+    int getPropertyUITemplates(Dpm::IFilter *filter, Dpm::IPropertyUITemplateIterator **templates) override
     {
         if (!templates)
             return 0;

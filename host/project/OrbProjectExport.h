@@ -3,7 +3,7 @@
 #include <QtCore/qglobal.h>
 
 #if defined(ORBPROJECT_LIBRARY)
-#  define ORBPROJECT_EXPORT Q_DECL_EXPORT
+#define ORBPROJECT_EXPORT Q_DECL_EXPORT
 #else
-#  define ORBPROJECT_EXPORT Q_DECL_IMPORT
+#define ORBPROJECT_EXPORT Q_DECL_IMPORT
 #endif

@@ -6,8 +6,7 @@ using Gui::Clip::String;
 
 namespace OrbProject {
 
-PartitionService::PartitionService(ModelPointer model)
-    : m_model(std::move(model))
+PartitionService::PartitionService(ModelPointer model) : m_model(std::move(model))
 {
 }
 

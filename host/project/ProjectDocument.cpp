@@ -38,8 +38,8 @@ public:
     {
         const QString value = text(name).trimmed();
         if (value.isEmpty() && !m_xml.hasError())
-            m_xml.raiseError(QStringLiteral("<%1> needs a non-empty \"%2\" attribute")
-                                 .arg(m_xml.name().toString(), name));
+            m_xml.raiseError(
+                QStringLiteral("<%1> needs a non-empty \"%2\" attribute").arg(m_xml.name().toString(), name));
         return value;
     }
 
@@ -156,8 +156,7 @@ bool ProjectDocument::read(const QString &path, QString *error)
                 document.sources.append(source);
             } else if (group == Group::Partitions && element == QLatin1String("partition")) {
                 document.partitions.append(attributes.required(QStringLiteral("name")));
-            } else if (group == Group::ProcessProperties
-                       && element == QLatin1String("processProperty")) {
+            } else if (group == Group::ProcessProperties && element == QLatin1String("processProperty")) {
                 ProcessProperty property;
                 property.name = attributes.required(QStringLiteral("name"));
                 property.id = attributes.text(QStringLiteral("id")).trimmed();
@@ -179,7 +178,8 @@ bool ProjectDocument::read(const QString &path, QString *error)
         }
     }
     if (file.refused())
-        return fail(error, QStringLiteral("%1: not a well-formed project file: %2").arg(path, file.refusal()));
+        return fail(error,
+                    QStringLiteral("%1: not a well-formed project file: %2").arg(path, file.refusal()));
     if (!xml.hasError() && !sawRoot)
         xml.raiseError(QStringLiteral("no <project> element"));
     if (xml.hasError()) {
@@ -281,8 +281,8 @@ QList<ProjectDocument::DesignProperty> ProjectDocument::effectiveProperties() co
         listed.insert(property.name);
 
     const std::pair<const char *, const QString *> derived[] = {
-        {"PROP_DevFamily", &target.family},   {"PROP_DevFamilyPMName", &target.family},
-        {"PROP_DevDevice", &target.device},   {"PROP_DevPackage", &target.package},
+        {"PROP_DevFamily", &target.family}, {"PROP_DevFamilyPMName", &target.family},
+        {"PROP_DevDevice", &target.device}, {"PROP_DevPackage", &target.package},
         {"PROP_DevSpeed", &target.speed},
     };
     QList<DesignProperty> result;

@@ -22,9 +22,8 @@ ProjectManagerService::ProjectManagerService()
         return static_cast<Dpm::IPartitionService *>(
             new PartitionService(ProjectManagerService::instance().currentModel()));
     });
-    CitP::Factory::RegisterCreator(Dpm::IFilter::objectId(), [] {
-        return static_cast<Dpm::IFilter *>(new PropertyFilter);
-    });
+    CitP::Factory::RegisterCreator(Dpm::IFilter::objectId(),
+                                   [] { return static_cast<Dpm::IFilter *>(new PropertyFilter); });
 }
 
 ProjectManagerService::~ProjectManagerService()
@@ -43,8 +42,7 @@ CitI::IInterface *ProjectManagerService::GetInterface(const Port::XUID &iid)
 Port::StringBase ProjectManagerService::getTargetFamily(CitI::IInterface *project)
 {
     const ProjectObject *object = ProjectObject::from(project);
-    return object ? Gui::Clip::String::convert(object->model()->document.target.family)
-                  : Port::StringBase();
+    return object ? Gui::Clip::String::convert(object->model()->document.target.family) : Port::StringBase();
 }
 
 CitI::IInterface *ProjectManagerService::getCurrentProject()

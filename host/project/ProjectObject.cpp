@@ -6,8 +6,7 @@
 
 namespace OrbProject {
 
-ProjectObject::ProjectObject(ModelPointer model)
-    : m_model(std::move(model))
+ProjectObject::ProjectObject(ModelPointer model) : m_model(std::move(model))
 {
 }
 

@@ -38,9 +38,9 @@ bool fail(QString *error, const QString &message)
 
 // Opens section and sub-section with `mode`, runs `operation` on the
 // sub-section and closes everything in order.
-bool withSubSection(const QString &projectFile, const QString &section, const QString &subSection,
-                    int mode, const std::function<int(Prjrep::IRegSection &)> &operation,
-                    const QString &what, QString *error)
+bool withSubSection(const QString &projectFile, const QString &section, const QString &subSection, int mode,
+                    const std::function<int(Prjrep::IRegSection &)> &operation, const QString &what,
+                    QString *error)
 {
     const QString where = QStringLiteral("%1: repository %2/%3").arg(projectFile, section, subSection);
     if (!CitP::Factory::LoadLibraryFactory(LibraryName))
@@ -48,20 +48,20 @@ bool withSubSection(const QString &projectFile, const QString &section, const QS
                                .arg(projectFile, QLatin1String(LibraryName)));
     Prjrep::AutoRelease<CitI::IInterface> object(
         CitP::Factory::CreateInstance(Prjrep::IRepository::objectId()));
-    auto *repository = object ? static_cast<Prjrep::IRepository *>(
-                                    object->GetInterface(Prjrep::IRepository::iid()))
-                              : nullptr;
+    auto *repository =
+        object ? static_cast<Prjrep::IRepository *>(object->GetInterface(Prjrep::IRepository::iid()))
+               : nullptr;
     if (!repository)
         return fail(error, QStringLiteral("%1: %2 provides no repository object")
                                .arg(projectFile, QLatin1String(LibraryName)));
 
     CitI::IInterface *sectionObject = nullptr;
-    int status = repository->openSection(String::convert(projectFile), String::convert(section),
-                                         mode, &sectionObject);
-    auto *opened = status == Prjrep::StatusOk && sectionObject
-                       ? static_cast<Prjrep::IRegSection *>(
-                             sectionObject->GetInterface(Prjrep::IRegSection::iid()))
-                       : nullptr;
+    int status =
+        repository->openSection(String::convert(projectFile), String::convert(section), mode, &sectionObject);
+    auto *opened =
+        status == Prjrep::StatusOk && sectionObject
+            ? static_cast<Prjrep::IRegSection *>(sectionObject->GetInterface(Prjrep::IRegSection::iid()))
+            : nullptr;
     bool done = false;
     if (!opened) {
         fail(error, QStringLiteral("%1: section: %2").arg(where, statusText(status)));
@@ -84,9 +84,8 @@ bool withSubSection(const QString &projectFile, const QString &section, const QS
 
 } // namespace
 
-bool RepositoryAccess::read(const QString &projectFile, const QString &section,
-                            const QString &subSection, const QString &key, QString *value,
-                            QString *error)
+bool RepositoryAccess::read(const QString &projectFile, const QString &section, const QString &subSection,
+                            const QString &key, QString *value, QString *error)
 {
     Port::StringBase text;
     const bool found = withSubSection(
@@ -98,14 +97,11 @@ bool RepositoryAccess::read(const QString &projectFile, const QString &section,
     return found;
 }
 
-bool RepositoryAccess::write(const QString &projectFile, const QString &section,
-                             const QString &subSection, const QString &key, const QString &value,
-                             QString *error)
+bool RepositoryAccess::write(const QString &projectFile, const QString &section, const QString &subSection,
+                             const QString &key, const QString &value, QString *error)
 {
     return withSubSection(
         projectFile, section, subSection, Prjrep::ModeReadWriteCreate,
-        [&](Prjrep::IRegSection &sub) {
-            return sub.setValue(String::convert(key), String::convert(value));
-        },
+        [&](Prjrep::IRegSection &sub) { return sub.setValue(String::convert(key), String::convert(value)); },
         QStringLiteral("key %1").arg(key), error);
 }

@@ -18,12 +18,10 @@ public:
     // Reads `key` (the repository must exist; nothing is created). True with
     // the value when the key is stored; false when it is not or on failure,
     // with a message in `error` in both cases.
-    static bool read(const QString &projectFile, const QString &section,
-                     const QString &subSection, const QString &key, QString *value,
-                     QString *error = nullptr);
+    static bool read(const QString &projectFile, const QString &section, const QString &subSection,
+                     const QString &key, QString *value, QString *error = nullptr);
     // Stores `value` under `key`, creating the repository, section and
     // sub-section when missing. False with a message on failure.
-    static bool write(const QString &projectFile, const QString &section,
-                      const QString &subSection, const QString &key, const QString &value,
-                      QString *error = nullptr);
+    static bool write(const QString &projectFile, const QString &section, const QString &subSection,
+                      const QString &key, const QString &value, QString *error = nullptr);
 };

@@ -42,18 +42,19 @@ bool PostgresServer::run(const QString &program, const QStringList &arguments)
     else
         process.start(path, arguments);
     const bool ok = process.waitForFinished(120000) && process.exitStatus() == QProcess::NormalExit
-        && process.exitCode() == 0;
+                    && process.exitCode() == 0;
     if (!ok)
         m_error = program + QLatin1String(" failed: ") + QString::fromLocal8Bit(process.readAll())
-            + process.errorString();
+                  + process.errorString();
     return ok;
 }
 
 bool PostgresServer::start()
 {
     if (!QFileInfo(QLatin1String(BinDir) + QLatin1String("/initdb")).isExecutable()) {
-        m_error = QStringLiteral("the PostgreSQL server programs are not in %1: install postgresql-15 "
-                                 "(make test and scripts/install-deps.sh do)")
+        m_error = QStringLiteral(
+                      "the PostgreSQL server programs are not in %1: install postgresql-15 "
+                      "(make test and scripts/install-deps.sh do)")
                       .arg(QLatin1String(BinDir));
         return false;
     }
@@ -73,10 +74,12 @@ bool PostgresServer::start()
     }
     // Stops the server and removes the folder should this process end without
     // the destructor.
-    const QString stop = (asRoot() ? QStringLiteral("runuser -u postgres -- ") : QString()) + QLatin1String(BinDir)
-        + QLatin1String("/pg_ctl -D ") + m_dir + QLatin1String("/data -m immediate stop");
-    const QString watchdog = QStringLiteral("exec </dev/null >/dev/null 2>&1; "
-                                            "while kill -0 %1 2>/dev/null; do sleep 1; done; %2; rm -rf %3")
+    const QString stop = (asRoot() ? QStringLiteral("runuser -u postgres -- ") : QString())
+                         + QLatin1String(BinDir) + QLatin1String("/pg_ctl -D ") + m_dir
+                         + QLatin1String("/data -m immediate stop");
+    const QString watchdog = QStringLiteral(
+                                 "exec </dev/null >/dev/null 2>&1; "
+                                 "while kill -0 %1 2>/dev/null; do sleep 1; done; %2; rm -rf %3")
                                  .arg(QString::number(QCoreApplication::applicationPid()), stop, m_dir);
     QProcess::startDetached(QStringLiteral("sh"), {"-c", watchdog});
     if (!run(QStringLiteral("initdb"), {"-D", m_dir + "/data", "-A", "trust", "-U", "postgres", "--no-locale",

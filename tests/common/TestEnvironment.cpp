@@ -59,8 +59,10 @@ void Environment::clearSettings() const
 
 QStringList Environment::locations()
 {
-    return {QLatin1String("XDG_CONFIG_HOME=") + QFileInfo(Gui::Clip::Settings::userFileName()).absolutePath().chopped(4),
-            QLatin1String("XDG_DATA_HOME=") + QStandardPaths::writableLocation(QStandardPaths::GenericDataLocation)};
+    return {QLatin1String("XDG_CONFIG_HOME=")
+                + QFileInfo(Gui::Clip::Settings::userFileName()).absolutePath().chopped(4),
+            QLatin1String("XDG_DATA_HOME=")
+                + QStandardPaths::writableLocation(QStandardPaths::GenericDataLocation)};
 }
 
 ToolRun runStaged(const QString &program, const QStringList &arguments, const QString &workDir,

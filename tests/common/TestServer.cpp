@@ -19,7 +19,7 @@ bool TestCertificates::openssl(const QStringList &arguments)
         || process.exitCode() != 0) {
         m_error = QLatin1String("openssl ") + arguments.join(QLatin1Char(' ')) + QLatin1String(": ")
                   + (process.error() == QProcess::FailedToStart ? QStringLiteral("cannot start openssl")
-                                                                 : QString::fromLocal8Bit(process.readAll()));
+                                                                : QString::fromLocal8Bit(process.readAll()));
         return false;
     }
     return true;
@@ -40,8 +40,9 @@ bool TestCertificates::create(const QString &dir, const QString &caName)
     const QString serial = QString::number(QRandomGenerator::global()->generate64() >> 1, 16);
     auto words = [](const QString &line) { return line.split(QLatin1Char(' ')); };
     return openssl(words(QLatin1String("req -x509 ") + key
-                         + QLatin1String("-days 2 -keyout ca.key -out ca.crt -addext basicConstraints=critical,CA:TRUE "
-                                         "-addext keyUsage=critical,keyCertSign,cRLSign -subj"))
+                         + QLatin1String(
+                             "-days 2 -keyout ca.key -out ca.crt -addext basicConstraints=critical,CA:TRUE "
+                             "-addext keyUsage=critical,keyCertSign,cRLSign -subj"))
                    << QLatin1String("/CN=") + caName)
            && openssl(words(QLatin1String("req -new ") + key
                             + QLatin1String("-keyout server.key -out server.csr -subj /CN=127.0.0.1")))
@@ -50,8 +51,7 @@ bool TestCertificates::create(const QString &dir, const QString &caName)
                             + serial));
 }
 
-TestServer::TestServer()
-    : m_dir(new QTemporaryDir)
+TestServer::TestServer() : m_dir(new QTemporaryDir)
 {
 }
 

@@ -39,8 +39,8 @@ class TestServer
 public:
     struct Upload
     {
-        QByteArray file;              // the stored report, as received
-        QString storedAs;             // its file name in the upload's folder
+        QByteArray file;               // the stored report, as received
+        QString storedAs;              // its file name in the upload's folder
         QMap<QString, QString> fields; // @fields.txt: received, file_loc, domain, regid, access, ...
     };
 

@@ -8,8 +8,8 @@
 
 #include "host/FileSupervisor.h"
 #include "host/Settings.h"
-#include "host/gui/ApplicationBase.h"
 #include "host/String.h"
+#include "host/gui/ApplicationBase.h"
 #include "host/project/OrbProject.h"
 #include "project/CorvidSettings.h"
 #include "project/ProjectRepositoryValues.h"
@@ -39,7 +39,10 @@ private Q_SLOTS:
 private:
     ToolRun orb(bool withProject, const QStringList &extraEnvironment = QStringList());
     // The requests the receiver has logged since the test function began.
-    QStringList requests() { return m_server->log().mid(m_logSeen).split(QLatin1Char('\n'), Qt::SkipEmptyParts); }
+    QStringList requests()
+    {
+        return m_server->log().mid(m_logSeen).split(QLatin1Char('\n'), Qt::SkipEmptyParts);
+    }
     // The send history that orb records into (the test's data location).
     static QList<CrvC_SendHistory::Entry> sent()
     {
@@ -49,8 +52,8 @@ private:
     }
     QString sendIteration() const
     {
-        return ProjectRepositoryValues::instance().getValue(m_projectFile,
-                                                            QLatin1String(ProjectRepositoryValues::SendIterationKey));
+        return ProjectRepositoryValues::instance().getValue(
+            m_projectFile, QLatin1String(ProjectRepositoryValues::SendIterationKey));
     }
 
     std::unique_ptr<Environment> m_env;
@@ -70,7 +73,8 @@ void TestEndToEnd::initTestCase()
     qputenv("CORVID_SERVER", m_server->baseUrl().toUtf8());
     TestServer::putStageBinFirstInPath();
     // Loopback only, whatever the developer's proxy variables say.
-    for (const char *name : {"http_proxy", "https_proxy", "HTTP_PROXY", "HTTPS_PROXY", "all_proxy", "ALL_PROXY"})
+    for (const char *name :
+         {"http_proxy", "https_proxy", "HTTP_PROXY", "HTTPS_PROXY", "all_proxy", "ALL_PROXY"})
         qunsetenv(name);
     m_project = m_env->home() + QLatin1String("/ledctrl");
     m_projectFile = m_project + QLatin1String("/ledctrl.orb");
@@ -82,7 +86,8 @@ void TestEndToEnd::init()
     m_env->clearSettings();
     QFile::remove(m_env->installRoot() + QLatin1String("/data/reports/corvidsettings"));
     // A direct connection, not the desktop's proxy.
-    Gui::Clip::Settings(QStringLiteral("WebUpdate"), true, true, true).setValue(QStringLiteral("ProxyChoice"), 0);
+    Gui::Clip::Settings(QStringLiteral("WebUpdate"), true, true, true)
+        .setValue(QStringLiteral("ProxyChoice"), 0);
     const QString sample = Environment::sourceDir() + QLatin1String("/examples/ledctrl");
     QDir(m_project).removeRecursively();
     for (QDirIterator it(sample, QDir::Files, QDirIterator::Subdirectories); it.hasNext();) {
@@ -104,7 +109,8 @@ ToolRun TestEndToEnd::orb(bool withProject, const QStringList &extraEnvironment)
         arguments << QStringLiteral("--project") << m_projectFile;
     arguments << QStringLiteral("open") << m_project + QLatin1String("/ledctrl_usage.xml");
     return runStaged(QStringLiteral("orb"), arguments, m_env->home(),
-                     QStringList{QStringLiteral("ORB_DEBUG=1")} + Environment::locations() + extraEnvironment);
+                     QStringList{QStringLiteral("ORB_DEBUG=1")} + Environment::locations()
+                         + extraEnvironment);
 }
 
 void TestEndToEnd::orbOpen_data()
@@ -135,9 +141,11 @@ void TestEndToEnd::orbOpen()
     QFETCH(QString, outcome);
     if (switchedOff == QLatin1String("by the user")) {
         CrvC_Settings::setValue(CrvC_Settings::CollectDeviceUsage, false);
-        CrvC_Settings::setValue(CrvC_Settings::CorvidTimeStamp, QDateTime::currentDateTime().toString(Qt::ISODate));
+        CrvC_Settings::setValue(CrvC_Settings::CorvidTimeStamp,
+                                QDateTime::currentDateTime().toString(Qt::ISODate));
     } else if (!switchedOff.isEmpty()) {
-        QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), "collectusagestatistics=false\n"));
+        QVERIFY(
+            m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), "collectusagestatistics=false\n"));
     }
     CrvC_Settings::setValue(CrvC_Settings::DontShowSendProgressDlg, !countdown);
     const bool unwritable = outcome == QLatin1String("no report written");
@@ -174,8 +182,8 @@ void TestEndToEnd::orbOpen()
     const QList<CrvC_SendHistory::Entry> entries = sent();
     QCOMPARE(entries.size(), recordedBefore + 1);
     QCOMPARE(entries.first().outcome(), QStringLiteral("sent"));
-    const ToolRun history = runStaged("corvid-history", {"show", QString::number(entries.first().id)}, m_env->home(),
-                                    Environment::locations());
+    const ToolRun history = runStaged("corvid-history", {"show", QString::number(entries.first().id)},
+                                      m_env->home(), Environment::locations());
     QVERIFY(history.standardOutput == m_server->upload(uploadsBefore).file);
     QVERIFY2(run.output.contains("orb: Usage report sent to 127.0.0.1, "), qPrintable(run.output));
 }
@@ -195,14 +203,16 @@ void TestEndToEnd::emailMethodComposesWithTheReport()
     CrvC_Settings::setValue(CrvC_Settings::UseSSL, false);
     CrvC_Settings::setValue(CrvC_Settings::DontShowSendToDlg, true);
     CrvC_Settings::setValue(CrvC_Settings::SelectedEmailTool, mailer);
-    const ToolRun run = orb(true, {QLatin1String("FAKE_MAIL_LOG=") + log,
-                                   QLatin1String("PATH=") + bin + QLatin1Char(':') + qEnvironmentVariable("PATH")});
+    const ToolRun run =
+        orb(true, {QLatin1String("FAKE_MAIL_LOG=") + log,
+                   QLatin1String("PATH=") + bin + QLatin1Char(':') + qEnvironmentVariable("PATH")});
     QVERIFY2(run.exitCode == 0, qPrintable(run.output));
     QTRY_VERIFY2_WITH_TIMEOUT(QFile::exists(log), qPrintable(run.output), 10000);
     const QString request = QString::fromUtf8(readFile(log));
     QVERIFY2(request.startsWith(QLatin1String("thunderbird\n-compose\n")), qPrintable(request));
     // The attachment is the report's own copy, named as one argument value.
-    const QString encoded = request.section(QLatin1String("attachment='file://"), 1).section(QLatin1Char('\''), 0, 0);
+    const QString encoded =
+        request.section(QLatin1String("attachment='file://"), 1).section(QLatin1Char('\''), 0, 0);
     const QString attachment = QUrl::fromPercentEncoding(encoded.toLatin1());
     QVERIFY2(attachment.startsWith(qEnvironmentVariable("XDG_CACHE_HOME")), qPrintable(request));
     QCOMPARE(readFile(attachment), readFile(m_page));
@@ -218,8 +228,8 @@ void TestEndToEnd::declineSendsNothing()
     QVERIFY2(OrbProject::openCurrentProject(m_projectFile, &error), qPrintable(error));
     QPluginLoader plugin(Environment::stageDir() + QLatin1String("/lib/orb/plugins/libCorvid.so"));
     QVERIFY2(plugin.instance(), qPrintable(plugin.errorString()));
-    const auto editors = Gui::Clip::FileSupervisor::getInstance()->editors(
-        Gui::Clip::FileSupervisor::fileEditorCategory());
+    const auto editors =
+        Gui::Clip::FileSupervisor::getInstance()->editors(Gui::Clip::FileSupervisor::fileEditorCategory());
     QCOMPARE(editors.size(), std::size_t(1));
 
     const qsizetype recordedBefore = sent().size();
@@ -243,7 +253,8 @@ void TestEndToEnd::declineSendsNothing()
         });
         countdown->findChild<QPushButton *>(QStringLiteral("cancelButton"))->click();
     });
-    editors.front()->openFile(Gui::Clip::String::convert(m_project + QLatin1String("/ledctrl_usage.xml")), 0, nullptr);
+    editors.front()->openFile(Gui::Clip::String::convert(m_project + QLatin1String("/ledctrl_usage.xml")), 0,
+                              nullptr);
     QTRY_VERIFY_WITH_TIMEOUT(declined, 10000);
     // Well past the countdown: nothing may go out late.
     QTest::qWait(6000);

@@ -29,10 +29,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t *data, size_t size)
     const QString first = CorvidFuzz::workDir() + QLatin1String("/first.orb");
     const QString second = CorvidFuzz::workDir() + QLatin1String("/second.orb");
     OrbProject::ProjectDocument reread;
-    if (!document.write(first, &error) || !reread.read(first, &error)
-        || !reread.write(second, &error)) {
-        std::fprintf(stderr, "a project that was read does not save and read back: %s\n",
-                     qPrintable(error));
+    if (!document.write(first, &error) || !reread.read(first, &error) || !reread.write(second, &error)) {
+        std::fprintf(stderr, "a project that was read does not save and read back: %s\n", qPrintable(error));
         std::abort();
     }
     if (contents(first) != contents(second)) {

@@ -51,7 +51,7 @@ public Q_SLOTS:
             return;
         auto *item = new PropItem(QStringLiteral("Corvid"), QStringLiteral("Corvid"),
                                   QStringLiteral("Control"), "corvid-item");
-        item->setPropPageCreator(&creator, SLOT(OnCreatePrefPage(QWidget*,PropItem*)));
+        item->setPropPageCreator(&creator, SLOT(OnCreatePrefPage(QWidget *, PropItem *)));
         collector.getPropSheet()->addItem(item, false, 1);
     }
 };
@@ -68,8 +68,8 @@ private Q_SLOTS:
 void TestPropSheet::pagesAreMadeOnFirstShowAndDriven()
 {
     Contributor contributor;
-    QVERIFY(QObject::connect(qApp, SIGNAL(dataRequested(Gui::Clip::DataCollector&)), &contributor,
-                             SLOT(onDataRequested(Gui::Clip::DataCollector&))));
+    QVERIFY(QObject::connect(qApp, SIGNAL(dataRequested(Gui::Clip::DataCollector &)), &contributor,
+                             SLOT(onDataRequested(Gui::Clip::DataCollector &))));
     PropSheet sheet;
     DataCollector collector(DataCollector::PreferenceSheet, &sheet);
     static_cast<ApplicationBase *>(qApp)->requestData(collector);

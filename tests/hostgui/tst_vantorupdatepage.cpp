@@ -45,7 +45,7 @@ QRadioButton *button(const VantorUpdatePage &page, const QString &choice)
 {
     return choice == QLatin1String("manual") ? page.manualProxyButton()
            : choice == QLatin1String("none") ? page.noProxyButton()
-                                              : page.systemProxyButton();
+                                             : page.systemProxyButton();
 }
 
 } // namespace
@@ -72,16 +72,49 @@ void TestVantorUpdatePage::loadAndApply_data()
     QTest::addColumn<QString>("port");
     QTest::addColumn<QString>("after");
 
-    QTest::newRow("nothing stored; manual host and port")
-        << "-|-|-" << "system" << "manual" << " proxy.lan " << "3128" << "2|proxy.lan|3128";
-    QTest::newRow("no proxy; system") << "0|-|-" << "none" << "system" << "" << "" << "1|-|-";
-    QTest::newRow("manual; without port drops the old port") << "2|old|80" << "manual" << "manual" << "h" << "" << "2|h|-";
-    QTest::newRow("manual; without host") << "2|old|80" << "manual" << "manual" << " " << "80" << "2|-|80";
+    QTest::newRow("nothing stored; manual host and port") << "-|-|-"
+                                                          << "system"
+                                                          << "manual"
+                                                          << " proxy.lan "
+                                                          << "3128"
+                                                          << "2|proxy.lan|3128";
+    QTest::newRow("no proxy; system") << "0|-|-"
+                                      << "none"
+                                      << "system"
+                                      << ""
+                                      << ""
+                                      << "1|-|-";
+    QTest::newRow("manual; without port drops the old port") << "2|old|80"
+                                                             << "manual"
+                                                             << "manual"
+                                                             << "h"
+                                                             << ""
+                                                             << "2|h|-";
+    QTest::newRow("manual; without host") << "2|old|80"
+                                          << "manual"
+                                          << "manual"
+                                          << " "
+                                          << "80"
+                                          << "2|-|80";
     // Refused before anything is stored.
-    QTest::newRow("unknown choice; port out of range refused")
-        << "7|h|-" << "system" << "manual" << "h" << "99999" << "7|h|-";
-    QTest::newRow("not a number; system") << "abc|-|-" << "system" << "system" << "" << "" << "1|-|-";
-    QTest::newRow("manual; no proxy keeps the manual entry") << "2|h|80" << "manual" << "none" << "x" << "1" << "0|h|80";
+    QTest::newRow("unknown choice; port out of range refused") << "7|h|-"
+                                                               << "system"
+                                                               << "manual"
+                                                               << "h"
+                                                               << "99999"
+                                                               << "7|h|-";
+    QTest::newRow("not a number; system") << "abc|-|-"
+                                          << "system"
+                                          << "system"
+                                          << ""
+                                          << ""
+                                          << "1|-|-";
+    QTest::newRow("manual; no proxy keeps the manual entry") << "2|h|80"
+                                                             << "manual"
+                                                             << "none"
+                                                             << "x"
+                                                             << "1"
+                                                             << "0|h|80";
 }
 
 void TestVantorUpdatePage::loadAndApply()

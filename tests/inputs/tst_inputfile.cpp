@@ -34,11 +34,11 @@ using Status = InputFile::Status;
 namespace HostileInputs {
 
 enum class Case {
-    Fifo,         // a named pipe with no writer
-    DeviceLink,   // a symbolic link to /dev/zero
-    Directory,    // a directory of that name
-    OverLimit,    // a sparse file one byte above the limit of its kind
-    Endless,      // a symbolic link to /proc/self/pagemap: size 0, reads without end
+    Fifo,               // a named pipe with no writer
+    DeviceLink,         // a symbolic link to /dev/zero
+    Directory,          // a directory of that name
+    OverLimit,          // a sparse file one byte above the limit of its kind
+    Endless,            // a symbolic link to /proc/self/pagemap: size 0, reads without end
     EntityDoubling,     // an internal DTD whose entities double at every level
     NestedContentModel, // an internal DTD with 70,000 nested parentheses
     Utf7EntityDoubling, // the same two, declared and written in UTF-7
@@ -49,7 +49,7 @@ enum class Case {
 const char *name(Case c)
 {
     static const char *const names[] = {
-        "named pipe",           "link to /dev/zero",         "directory",
+        "named pipe",           "link to /dev/zero",          "directory",
         "over the limit",       "link to /proc/self/pagemap", "entity doubling",
         "nested content model", "utf7-entity-doubling",       "utf7-nested-content-model",
         "attribute flood"};
@@ -71,8 +71,7 @@ bool plant(const QString &path, Case c, InputFile::Kind kind, const QString &rea
         return QDir().mkpath(path);
     case Case::OverLimit: {
         QFile file(path);
-        return file.open(QIODevice::WriteOnly)
-            && file.resize(InputFile::sizeLimit(kind) + 1);
+        return file.open(QIODevice::WriteOnly) && file.resize(InputFile::sizeLimit(kind) + 1);
     }
     case Case::Endless:
         return QFile::link(QStringLiteral("/proc/self/pagemap"), path);
@@ -80,9 +79,10 @@ bool plant(const QString &path, Case c, InputFile::Kind kind, const QString &rea
     case Case::NestedContentModel:
     case Case::Utf7EntityDoubling:
     case Case::Utf7NestedContentModel:
-        return QFile::copy(QStringLiteral(CORVID_SOURCE_DIR "/tests/fuzz/regressions/%1/%2.xml")
-                               .arg(reader, QString::fromLatin1(name(c)).replace(QLatin1Char(' '), QLatin1Char('-'))),
-                           path);
+        return QFile::copy(
+            QStringLiteral(CORVID_SOURCE_DIR "/tests/fuzz/regressions/%1/%2.xml")
+                .arg(reader, QString::fromLatin1(name(c)).replace(QLatin1Char(' '), QLatin1Char('-'))),
+            path);
     case Case::AttributeFlood: {
         QByteArray xml = "<r";
         for (int i = 0; i < 160000; ++i)
@@ -115,7 +115,7 @@ struct Reader
 };
 
 // A reader that fills report data, and what it filled.
-template <typename Fill, typename Show>
+template<typename Fill, typename Show>
 std::function<QString(const QString &)> filling(Fill fill, Show show)
 {
     return [fill, show](const QString &path) {
@@ -135,9 +135,10 @@ QList<Reader> readers()
     return {
         {"map report", InputFile::MapReport,
          "Target Device : xc3s500e\nTarget Package : fg320\nTarget Speed : -4\n",
-         filling(CrvC_SynthesisReport::readTargetInfo, [](const CrvC_ReportData &data) -> QString {
-             return data.targetDevice + data.targetPackage + data.targetSpeed;
-         })},
+         filling(CrvC_SynthesisReport::readTargetInfo,
+                 [](const CrvC_ReportData &data) -> QString {
+                     return data.targetDevice + data.targetPackage + data.targetSpeed;
+                 })},
         {"synthesis report", InputFile::SynthesisReport,
          "Advanced HDL Synthesis Report\n# RAMs : 1\n 16x8-bit RAM : 1\n================\n",
          filling(CrvC_SynthesisReport::readMacroStatistics, CrvC_SynthesisReport::macroStatisticsCell)},
@@ -150,7 +151,8 @@ QList<Reader> readers()
              return QString::number(read) + data.deviceUsage.keys().join(QLatin1Char('|'));
          },
          "DeviceUsageReport", "usagexml"},
-        {"command log", InputFile::CommandLog, "par -w top\n", filling(CrvC_CommandLog::readCommandLog, history)},
+        {"command log", InputFile::CommandLog, "par -w top\n",
+         filling(CrvC_CommandLog::readCommandLog, history)},
         {"fuse log", InputFile::FuseLog, "", filling(CrvC_CommandLog::checkFuseLog, history)},
         {"netlist-build report", InputFile::CoreReport,
          "<document><scope stringID='LNKGEN_CORE_INSTANCE'>"
@@ -217,9 +219,8 @@ private Q_SLOTS:
         m_env.reset(new CorvidTest::Environment);
         QVERIFY(m_dir.isValid());
         qputenv("APPDATA", QFile::encodeName(m_dir.filePath(QStringLiteral("appdata"))));
-        m_previousSink = Port_MsgManData::setSink([this](const Port_MsgManData::Message &m) {
-            m_debug << QString::fromStdString(m.text);
-        });
+        m_previousSink = Port_MsgManData::setSink(
+            [this](const Port_MsgManData::Message &m) { m_debug << QString::fromStdString(m.text); });
     }
 
     void init() { m_debug.clear(); }
@@ -227,15 +228,20 @@ private Q_SLOTS:
 
     void open_data()
     {
-        QTest::addColumn<QString>("setup"); // "regular", "link", "missing", "dangling", "at limit" or a case name
+        QTest::addColumn<QString>(
+            "setup"); // "regular", "link", "missing", "dangling", "at limit" or a case name
         QTest::addColumn<int>("kind");
         QTest::addColumn<InputFile::Status>("status");
 
         const std::pair<const char *, Status> setups[] = {
-            {"regular", Status::Opened},           {"link", Status::Opened},
-            {"at limit", Status::Opened},          {"missing", Status::Missing},
-            {"dangling", Status::Missing},         {"named pipe", Status::NotRegular},
-            {"link to /dev/zero", Status::NotRegular}, {"directory", Status::NotRegular},
+            {"regular", Status::Opened},
+            {"link", Status::Opened},
+            {"at limit", Status::Opened},
+            {"missing", Status::Missing},
+            {"dangling", Status::Missing},
+            {"named pipe", Status::NotRegular},
+            {"link to /dev/zero", Status::NotRegular},
+            {"directory", Status::NotRegular},
             {"over the limit", Status::TooLarge},
         };
         // Two kinds with different limits are enough here; every kind meets
@@ -260,9 +266,11 @@ private Q_SLOTS:
         if (setup == QLatin1String("regular"))
             QVERIFY(CorvidTest::writeFile(path, "contents\n"));
         else if (setup == QLatin1String("link") || setup == QLatin1String("dangling"))
-            QVERIFY(QFile::link(setup == QLatin1String("link") ? regular : path + QLatin1String(".none"), path));
+            QVERIFY(
+                QFile::link(setup == QLatin1String("link") ? regular : path + QLatin1String(".none"), path));
         else if (setup == QLatin1String("at limit"))
-            QVERIFY(CorvidTest::writeFile(path, QByteArray()) && QFile::resize(path, InputFile::sizeLimit(k)));
+            QVERIFY(CorvidTest::writeFile(path, QByteArray())
+                    && QFile::resize(path, InputFile::sizeLimit(k)));
         for (Case c : {Case::Fifo, Case::DeviceLink, Case::Directory, Case::OverLimit})
             if (setup == QLatin1String(HostileInputs::name(c)))
                 QVERIFY(HostileInputs::plant(path, c, k));
@@ -281,7 +289,8 @@ private Q_SLOTS:
         if (status == Status::Opened || status == Status::Missing)
             QVERIFY2(m_debug.isEmpty(), qPrintable(m_debug.join(QLatin1Char('|'))));
         else
-            QVERIFY2(!reason.isEmpty() && m_debug.value(0).contains(path) && m_debug.value(0).contains(reason),
+            QVERIFY2(!reason.isEmpty() && m_debug.value(0).contains(path)
+                         && m_debug.value(0).contains(reason),
                      qPrintable(m_debug.join(QLatin1Char('|'))));
         QByteArray bytes("stale");
         QCOMPARE(InputFile::readAll(path, k, bytes), status);
@@ -305,13 +314,13 @@ private Q_SLOTS:
         QTest::newRow("empty internal subset") << QByteArray("<!DOCTYPE r []><r/>") << true;
         QTest::newRow("external and internal")
             << QByteArray("<!DOCTYPE r SYSTEM 'r.dtd' [<!ELEMENT r ANY>]><r/>") << true;
-        QTest::newRow("declaration without a doctype")
-            << QByteArray("<!ENTITY a 'b'><r/>") << true;
+        QTest::newRow("declaration without a doctype") << QByteArray("<!ENTITY a 'b'><r/>") << true;
         QTest::newRow("after a long comment")
             << QByteArray("<!--" + QByteArray(200000, 'x') + "--><!DOCTYPE r [ ]><r/>") << true;
         QTest::newRow("UTF-8 byte-order mark, then a subset")
             << QByteArray("\xEF\xBB\xBF<!DOCTYPE r [<!ENTITY a 'b'>]><r/>") << true;
-        const auto document = [](const char *encoding, const char *rest = "<!DOCTYPE r [<!ENTITY a 'b'>]><r/>") {
+        const auto document = [](const char *encoding,
+                                 const char *rest = "<!DOCTYPE r [<!ENTITY a 'b'>]><r/>") {
             return QStringLiteral("<?xml version='1.0' encoding='%1'?>%2")
                 .arg(QLatin1String(encoding), QLatin1String(rest));
         };
@@ -427,12 +436,13 @@ private Q_SLOTS:
         QVERIFY(QFile::remove(path));
 
         if (setup == QLatin1String("external DTD")) {
-            QVERIFY(CorvidTest::writeFile(path, "<?xml version=\"1.0\"?>\n<!DOCTYPE " + QByteArray(reader.root)
-                                                + " SYSTEM \"http://127.0.0.1:9/none.dtd\">\n" + reader.sample));
+            QVERIFY(CorvidTest::writeFile(
+                path, "<?xml version=\"1.0\"?>\n<!DOCTYPE " + QByteArray(reader.root)
+                          + " SYSTEM \"http://127.0.0.1:9/none.dtd\">\n" + reader.sample));
             QCOMPARE(reader.read(path), plain);
         } else {
-            QVERIFY(HostileInputs::plant(path, hostile, reader.kind,
-                                         QString::fromLatin1(reader.regressions)));
+            QVERIFY(
+                HostileInputs::plant(path, hostile, reader.kind, QString::fromLatin1(reader.regressions)));
             // An endless file is read up to the limit: a small one keeps the test quick.
             const qint64 limit = InputFile::setSizeLimit(reader.kind, hostile == Case::Endless ? 1 << 20 : 0);
             QElapsedTimer timer;
@@ -454,14 +464,19 @@ private Q_SLOTS:
         QVERIFY(QDir().mkpath(project + QLatin1String("/osim")));
         const QString previous = QDir::currentPath();
         QVERIFY(QDir::setCurrent(project));
-        const char *const inputs[] = {"top.snx", "top_map.ktp", "top_usage.xml", "top.cmd_log",
-                                      "fuse.log", "top_lnkgen.drpt", "par_usage_statistics.html",
+        const char *const inputs[] = {"top.snx",
+                                      "top_map.ktp",
+                                      "top_usage.xml",
+                                      "top.cmd_log",
+                                      "fuse.log",
+                                      "top_lnkgen.drpt",
+                                      "par_usage_statistics.html",
                                       "osim/osim_usage_statistics.html"};
         for (const char *input : inputs)
             QVERIFY(HostileInputs::plant(project + QLatin1Char('/') + QLatin1String(input), Case::Fifo,
                                          InputFile::UsageXml));
-        QVERIFY(HostileInputs::plant(CrvC_HelpViewerData::helpFilePath(), Case::Fifo,
-                                     InputFile::HelpViewerData));
+        QVERIFY(
+            HostileInputs::plant(CrvC_HelpViewerData::helpFilePath(), Case::Fifo, InputFile::HelpViewerData));
 
         QElapsedTimer timer;
         timer.start();

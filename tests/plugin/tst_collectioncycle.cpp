@@ -95,9 +95,11 @@ void TestCollectionCycle::gating()
         QVERIFY(OrbProject::openCurrentProject(m_projectFile));
     if (switchedOff == QLatin1String("by the user")) {
         CrvC_Settings::setValue(CrvC_Settings::CollectDeviceUsage, false);
-        CrvC_Settings::setValue(CrvC_Settings::CorvidTimeStamp, QDateTime::currentDateTime().toString(Qt::ISODate));
+        CrvC_Settings::setValue(CrvC_Settings::CorvidTimeStamp,
+                                QDateTime::currentDateTime().toString(Qt::ISODate));
     } else if (!switchedOff.isEmpty()) {
-        QVERIFY(m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), "collectusagestatistics=false\n"));
+        QVERIFY(
+            m_env->writeDataFile(QStringLiteral("reports/corvidsettings"), "collectusagestatistics=false\n"));
     }
     QFETCH(bool, dontShowProgress);
     CrvC_Settings::setValue(CrvC_Settings::DontShowSendProgressDlg, dontShowProgress);
@@ -122,8 +124,10 @@ void TestCollectionCycle::designName_data()
     // Without an open context; the context's design text is read in orb's tests.
     QTest::addColumn<QString>("fileName");
     QTest::addColumn<QString>("expected");
-    QTest::newRow("cut at the last underscore") << "my_top_usage.xml" << "my_top";
-    QTest::newRow("no underscore") << "usage.xml" << "usage";
+    QTest::newRow("cut at the last underscore") << "my_top_usage.xml"
+                                                << "my_top";
+    QTest::newRow("no underscore") << "usage.xml"
+                                   << "usage";
 }
 
 void TestCollectionCycle::designName()
@@ -147,7 +151,8 @@ void TestCollectionCycle::unreachableFolderEndsTheCycle()
         QCOMPARE(m_starts.size(), 0);
         QCOMPARE(QDir::currentPath(), before);
         // The report tool run on its own refuses it the same way.
-        const CorvidTest::ToolRun tool = CorvidTest::runStaged(QStringLiteral("corvid-report"), {usageFile}, before);
+        const CorvidTest::ToolRun tool =
+            CorvidTest::runStaged(QStringLiteral("corvid-report"), {usageFile}, before);
         QCOMPARE(tool.exitCode, 1);
         QVERIFY2(tool.output.contains(QLatin1String("cannot enter the folder")), qPrintable(tool.output));
         QVERIFY(!QFile::exists(before + QLatin1String("/device_usage_statistics.html")));

@@ -22,8 +22,8 @@ QString pluginPath()
 
 GuiI::IFileEditorManager *registeredEditor()
 {
-    const auto editors = Gui::Clip::FileSupervisor::getInstance()->editors(
-        Gui::Clip::FileSupervisor::fileEditorCategory());
+    const auto editors =
+        Gui::Clip::FileSupervisor::getInstance()->editors(Gui::Clip::FileSupervisor::fileEditorCategory());
     return editors.empty() ? nullptr : editors.front();
 }
 

@@ -42,22 +42,32 @@ void TestCorvidSettings::collectionSwitch_data()
         return file;
     };
 
-    QTest::newRow("no user stamp: user value ignored") << install("false") << "true" << "" << false;
-    QTest::newRow("capital True is off") << install("True") << "" << "" << false;
-    QTest::newRow("value with trailing blank is off") << install("true ") << "" << "" << false;
+    QTest::newRow("no user stamp: user value ignored") << install("false") << "true"
+                                                       << "" << false;
+    QTest::newRow("capital True is off") << install("True") << ""
+                                         << "" << false;
+    QTest::newRow("value with trailing blank is off") << install("true ") << ""
+                                                      << "" << false;
     QTest::newRow("equal stamps: install wins") << install("false", earlier) << "true" << earlier << false;
     QTest::newRow("install newer wins") << install("true", later) << "false" << earlier << true;
     QTest::newRow("extra parts ignored, later line wins")
-        << install("false") + "collectusagestatistics=true=x\n" << "" << "" << true;
+        << install("false") + "collectusagestatistics=true=x\n"
+        << ""
+        << "" << true;
     QTest::newRow("blanks round the key and =: off")
-        << QByteArray(" collectusagestatistics\t= false\n") << "true" << "" << false;
-    QTest::newRow("blank before the value of true: off") << install(" true") << "" << "" << false;
+        << QByteArray(" collectusagestatistics\t= false\n") << "true"
+        << "" << false;
+    QTest::newRow("blank before the value of true: off") << install(" true") << ""
+                                                         << "" << false;
     QTest::newRow("key in capitals, spaced stamp: install newer wins")
         << QByteArray("CollectUsageStatistics=false\nTimeStamp = " + later.toLatin1() + " \n") << "true"
         << earlier << false;
-    QTest::newRow("line without = ignored") << install("false") + "collectusagestatistics\n" << "" << "" << false;
+    QTest::newRow("line without = ignored") << install("false") + "collectusagestatistics\n"
+                                            << ""
+                                            << "" << false;
     QTest::newRow("unknown keys and binary junk ignored")
-        << QByteArray("colour=blue\n") + QByteArray("\x01\x02\xff=\0zz\n", 8) + install("false") << "" << "" << false;
+        << QByteArray("colour=blue\n") + QByteArray("\x01\x02\xff=\0zz\n", 8) + install("false") << ""
+        << "" << false;
 }
 
 void TestCorvidSettings::collectionSwitch()

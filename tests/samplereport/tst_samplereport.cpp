@@ -91,7 +91,8 @@ private Q_SLOTS:
         m_work = m_env->home() + QLatin1String("/work");
         QVERIFY(CorvidTest::writeFile(m_work + QLatin1String("/top_usage.xml"), "<usage/>"));
         QVERIFY(QDir().mkpath(m_work + QLatin1String("/fresh"))
-                && QFile::copy(project + QLatin1String("/ledctrl.orb"), m_work + QLatin1String("/fresh/fresh.orb")));
+                && QFile::copy(project + QLatin1String("/ledctrl.orb"),
+                               m_work + QLatin1String("/fresh/fresh.orb")));
 
         m_projectFile = project + QLatin1String("/ledctrl.orb");
         QString error;

@@ -31,7 +31,8 @@ private Q_SLOTS:
         m_env.reset(new CorvidTest::Environment);
         m_path = qgetenv("PATH");
         CrvC_UserNotice::setHandlers(
-            [this](const QString &text, const QString &details) { m_warnings << text + '|' + details; }, nullptr);
+            [this](const QString &text, const QString &details) { m_warnings << text + '|' + details; },
+            nullptr);
     }
 
     void cleanupTestCase() { CrvC_UserNotice::setHandlers(nullptr, nullptr); }
@@ -46,13 +47,16 @@ private Q_SLOTS:
         QDir().mkpath(m_env->home() + "/a/netscape"); // a folder is no program
         // Folders in order, each once; only the first xdg-email.
         const QString home = m_env->home();
-        qputenv("PATH", QFile::encodeName(QStringList{home + "/b", home + "/missing", "", home + "/a", home + "/a/"}.join(':')));
+        qputenv("PATH",
+                QFile::encodeName(
+                    QStringList{home + "/b", home + "/missing", "", home + "/a", home + "/a/"}.join(':')));
         QStringList found;
         // The fixed fall-back folders may hold programs of this machine.
         for (const QString &tool : CrvC_DataCollectionEmail().emailTools())
             if (tool.startsWith(home + '/'))
                 found << tool.mid(home.size() + 1);
-        QCOMPARE(found, (QStringList{"b/netscape", "b/thunderbird", "a/mozilla", "a/thunderbird", "b/xdg-email"}));
+        QCOMPARE(found,
+                 (QStringList{"b/netscape", "b/thunderbird", "a/mozilla", "a/thunderbird", "b/xdg-email"}));
     }
 
     void mailProgramArguments_data()
@@ -63,20 +67,40 @@ private Q_SLOTS:
         QTest::addColumn<QString>("file");
         QTest::addColumn<QStringList>("arguments"); // empty: refused, nothing started
         const QString compose = "to='c@x.example',subject='Corvid',body='%1',attachment='file://%2'";
-        QTest::newRow("compose") << "mail" << "thunderbird" << "" << "/p q/r.html"
+        QTest::newRow("compose") << "mail"
+                                 << "thunderbird"
+                                 << ""
+                                 << "/p q/r.html"
                                  << QStringList{"-compose", compose.arg("", "/p%20q/r.html")};
-        QTest::newRow("folder with a space") << "my apps" << "mozilla" << "b" << "/p/r.html"
-                                             << QStringList{"-compose", compose.arg("b", "/p/r.html")};
+        QTest::newRow("folder with a space")
+            << "my apps"
+            << "mozilla"
+            << "b"
+            << "/p/r.html" << QStringList{"-compose", compose.arg("b", "/p/r.html")};
         // Quotes and commas stay inside the request's values.
-        QTest::newRow("compose, odd path") << "mail" << "netscape" << "" << "/a\"b,c'd/r.html"
-                                           << QStringList{"-compose", compose.arg("", "/a%22b%2Cc%27d/r.html")};
-        QTest::newRow("xdg-email") << "mail" << "xdg-email" << "" << "/p q/r.html"
-                                   << QStringList{"--subject", "Corvid", "--attach", "/p q/r.html", "c@x.example"};
+        QTest::newRow("compose, odd path")
+            << "mail"
+            << "netscape"
+            << ""
+            << "/a\"b,c'd/r.html" << QStringList{"-compose", compose.arg("", "/a%22b%2Cc%27d/r.html")};
+        QTest::newRow("xdg-email") << "mail"
+                                   << "xdg-email"
+                                   << ""
+                                   << "/p q/r.html"
+                                   << QStringList{"--subject", "Corvid", "--attach", "/p q/r.html",
+                                                  "c@x.example"};
         QTest::newRow("xdg-email, odd path and body")
-            << "mail" << "xdg-email" << "see \"it\"" << "/a\"b,c'd --new-instance/r.html"
-            << QStringList{"--subject", "Corvid", "--body", "see \"it\"", "--attach",
-                           "/a\"b,c'd --new-instance/r.html", "c@x.example"};
-        QTest::newRow("line break in the path") << "mail" << "xdg-email" << "" << "/p\nq/r.html" << QStringList();
+            << "mail"
+            << "xdg-email"
+            << "see \"it\""
+            << "/a\"b,c'd --new-instance/r.html"
+            << QStringList{"--subject",  "Corvid",   "--body",
+                           "see \"it\"", "--attach", "/a\"b,c'd --new-instance/r.html",
+                           "c@x.example"};
+        QTest::newRow("line break in the path") << "mail"
+                                                << "xdg-email"
+                                                << ""
+                                                << "/p\nq/r.html" << QStringList();
     }
 
     void mailProgramArguments()
@@ -89,7 +113,8 @@ private Q_SLOTS:
         const QString log = m_env->home() + "/mail.log";
         QFile::remove(log);
         qputenv("FAKE_MAIL_LOG", QFile::encodeName(log));
-        CrvC_DataCollectionEmail().send(programDir(folder, {name}) + '/' + name, "c@x.example", "Corvid", body, file);
+        CrvC_DataCollectionEmail().send(programDir(folder, {name}) + '/' + name, "c@x.example", "Corvid",
+                                        body, file);
         if (arguments.isEmpty()) { // refused before anything starts
             QVERIFY(m_warnings.size() == 1 && m_warnings.first().contains(file));
             return;
@@ -104,7 +129,8 @@ private Q_SLOTS:
         const QString tool = m_env->home() + "/none/thunderbird";
         CrvC_DataCollectionEmail().send(tool, "c@x.example", "Corvid", "", "/r.html");
         // Named, with the reason; reported before send() returns.
-        QVERIFY(m_warnings.size() == 1 && m_warnings.first().startsWith("Could not run E-mail Tool:\n" + tool + "|"));
+        QVERIFY(m_warnings.size() == 1
+                && m_warnings.first().startsWith("Could not run E-mail Tool:\n" + tool + "|"));
         QVERIFY2(m_warnings.first().contains("No such file"), qPrintable(m_warnings.first()));
     }
 };

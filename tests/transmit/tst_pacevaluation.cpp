@@ -5,9 +5,9 @@
 #include "transmit/ProxyScript.h"
 #include "transmit/SendUsingSSL.h"
 
-#include <QtTest>
 #include <QTcpServer>
 #include <QTcpSocket>
+#include <QtTest>
 
 #include <atomic>
 #include <sys/resource.h>
@@ -47,7 +47,8 @@ public:
             }
             if (path.startsWith("/endless")) {
                 socket->write("HTTP/1.0 200 OK\r\n\r\n");
-                while (!stopping && socket->write(QByteArray(65536, '/')) > 0 && socket->waitForBytesWritten(5000)) {
+                while (!stopping && socket->write(QByteArray(65536, '/')) > 0
+                       && socket->waitForBytesWritten(5000)) {
                 }
                 continue;
             }
@@ -83,7 +84,8 @@ QStringList childPrograms()
     for (const QString &pid : QDir("/proc").entryList(QDir::Dirs)) {
         const QByteArray stat = CorvidTest::readFile("/proc/" + pid + "/stat");
         const qsizetype close = stat.lastIndexOf(')');
-        if (close > 0 && stat.mid(close + 2).split(' ').value(1).toLongLong() == QCoreApplication::applicationPid())
+        if (close > 0
+            && stat.mid(close + 2).split(' ').value(1).toLongLong() == QCoreApplication::applicationPid())
             names << stat.mid(stat.indexOf('(') + 1, close - stat.indexOf('(') - 1);
     }
     return names;
@@ -114,14 +116,18 @@ class TestPacEvaluation : public QObject
     ScriptServer m_server;
     QString m_temp;
 
-    QString url(const QString &path) const { return QString("http://127.0.0.1:%1%2").arg(m_server.port).arg(path); }
+    QString url(const QString &path) const
+    {
+        return QString("http://127.0.0.1:%1%2").arg(m_server.port).arg(path);
+    }
     QStringList leftInTemp() const { return QDir(m_temp).entryList(QDir::Files); }
 
     // The desktop names the script at `path`; nothing is stored in "WebUpdate".
     void configureScript(const QString &path)
     {
         QVERIFY(CorvidTest::writeFile(m_env->home() + "/.config/kioslaverc",
-                                      "[Proxy Settings]\nProxyType=2\nProxy Config Script=" + url(path).toUtf8()));
+                                      "[Proxy Settings]\nProxyType=2\nProxy Config Script="
+                                          + url(path).toUtf8()));
         qputenv("XDG_CURRENT_DESKTOP", "KDE");
     }
 
@@ -129,7 +135,8 @@ private Q_SLOTS:
     void initTestCase()
     {
         m_env.reset(new CorvidTest::Environment);
-        for (const char *name : {"https_proxy", "HTTPS_PROXY", "http_proxy", "HTTP_PROXY", "all_proxy", "ALL_PROXY"})
+        for (const char *name :
+             {"https_proxy", "HTTPS_PROXY", "http_proxy", "HTTP_PROXY", "all_proxy", "ALL_PROXY"})
             qunsetenv(name);
         qputenv("CORVID_SERVER", "https://www.vantor.example");
         // The staged vancurl first on PATH; a private folder for temporary files.
@@ -143,13 +150,16 @@ private Q_SLOTS:
         m_server.files.insert("/loop.pac", "function FindProxyForURL(url, host) { while (true) {} }");
         m_server.files.insert("/throws.pac", "function FindProxyForURL(url, host) { throw 'no'; }");
         m_server.files.insert("/syntax.pac", "function FindProxyForURL(url, host) { return \"PROXY");
-        m_server.files.insert("/binary.pac", QByteArray("\x7f" "ELF\0\0\xff\xfe", 8));
+        m_server.files.insert("/binary.pac", QByteArray("\x7f"
+                                                        "ELF\0\0\xff\xfe",
+                                                        8));
         m_server.files.insert("/undefined.pac", script("return;"));
         m_server.files.insert("/null.pac", script("return null;"));
         m_server.files.insert("/number.pac", script("return 8080;"));
         m_server.files.insert("/greedy.pac", script("var s = 'x'; while (true) s = s + s;"));
-        m_server.files.insert("/long.pac", script("var a = []; for (var i = 0; i < 1000; i++) a.push('PROXY h:1');"
-                                                  "return a.join('; ');"));
+        m_server.files.insert("/long.pac",
+                              script("var a = []; for (var i = 0; i < 1000; i++) a.push('PROXY h:1');"
+                                     "return a.join('; ');"));
         m_server.files.insert("/longhost.pac", script("return 'PROXY ' + new Array(2000).join('h');"));
         m_server.start();
         m_server.ready.acquire();
@@ -167,21 +177,48 @@ private Q_SLOTS:
         QTest::addColumn<QString>("path");
         QTest::addColumn<QString>("host");
         QTest::addColumn<QString>("expected");
-        QTest::newRow("maker's server") << "/wpad.dat" << "www.vantor.example" << "PROXY h:8080; DIRECT";
-        QTest::newRow("other host") << "/wpad.dat" << "elsewhere.example" << "DIRECT";
-        QTest::newRow("loops") << "/loop.pac" << "www.vantor.example" << "";
-        QTest::newRow("throws") << "/throws.pac" << "www.vantor.example" << "";
-        QTest::newRow("syntax error") << "/syntax.pac" << "www.vantor.example" << "";
-        QTest::newRow("binary") << "/binary.pac" << "www.vantor.example" << "";
-        QTest::newRow("not found") << "/missing.pac" << "www.vantor.example" << "";
-        QTest::newRow("oversized download") << "/endless.pac" << "www.vantor.example" << "";
-        QTest::newRow("allocates without end") << "/greedy.pac" << "www.vantor.example" << "";
-        QTest::newRow("undefined") << "/undefined.pac" << "www.vantor.example" << "";
-        QTest::newRow("null") << "/null.pac" << "www.vantor.example" << "";
-        QTest::newRow("number") << "/number.pac" << "www.vantor.example" << "";
+        QTest::newRow("maker's server") << "/wpad.dat"
+                                        << "www.vantor.example"
+                                        << "PROXY h:8080; DIRECT";
+        QTest::newRow("other host") << "/wpad.dat"
+                                    << "elsewhere.example"
+                                    << "DIRECT";
+        QTest::newRow("loops") << "/loop.pac"
+                               << "www.vantor.example"
+                               << "";
+        QTest::newRow("throws") << "/throws.pac"
+                                << "www.vantor.example"
+                                << "";
+        QTest::newRow("syntax error") << "/syntax.pac"
+                                      << "www.vantor.example"
+                                      << "";
+        QTest::newRow("binary") << "/binary.pac"
+                                << "www.vantor.example"
+                                << "";
+        QTest::newRow("not found") << "/missing.pac"
+                                   << "www.vantor.example"
+                                   << "";
+        QTest::newRow("oversized download") << "/endless.pac"
+                                            << "www.vantor.example"
+                                            << "";
+        QTest::newRow("allocates without end") << "/greedy.pac"
+                                               << "www.vantor.example"
+                                               << "";
+        QTest::newRow("undefined") << "/undefined.pac"
+                                   << "www.vantor.example"
+                                   << "";
+        QTest::newRow("null") << "/null.pac"
+                              << "www.vantor.example"
+                              << "";
+        QTest::newRow("number") << "/number.pac"
+                                << "www.vantor.example"
+                                << "";
         // Cut after the last whole entry within 1023 bytes: 93 entries.
-        QTest::newRow("long answer") << "/long.pac" << "www.vantor.example" << QStringList(93, "PROXY h:1").join("; ");
-        QTest::newRow("long first entry") << "/longhost.pac" << "www.vantor.example" << "";
+        QTest::newRow("long answer") << "/long.pac"
+                                     << "www.vantor.example" << QStringList(93, "PROXY h:1").join("; ");
+        QTest::newRow("long first entry") << "/longhost.pac"
+                                          << "www.vantor.example"
+                                          << "";
     }
 
     void scripts()
@@ -192,7 +229,8 @@ private Q_SLOTS:
         QElapsedTimer timer;
         timer.start();
         QCOMPARE(CrvC_ProxyScript::run(url(path), "http://" + host, host), expected);
-        QVERIFY2(timer.elapsed() < CrvC_ProxyScript::TimeLimitMs + 3000, qPrintable(QString::number(timer.elapsed())));
+        QVERIFY2(timer.elapsed() < CrvC_ProxyScript::TimeLimitMs + 3000,
+                 qPrintable(QString::number(timer.elapsed())));
         QCOMPARE(leftInTemp(), QStringList());
         // No child (vancurl, corvid-pac) grew anywhere near the gigabytes an
         // unbounded script takes in these seconds.
@@ -261,7 +299,8 @@ private Q_SLOTS:
         const qint64 driverGone = timer.elapsed();
         qputenv("CORVID_SERVER", "https://www.vantor.example");
         QVERIFY2(stall < 250, qPrintable(QString::number(stall)));
-        QVERIFY2(driverGone >= CrvC_ProxyDiscovery::LimitMs && driverGone < CrvC_ProxyDiscovery::LimitMs + 5000,
+        QVERIFY2(driverGone >= CrvC_ProxyDiscovery::LimitMs
+                     && driverGone < CrvC_ProxyDiscovery::LimitMs + 5000,
                  qPrintable(QString::number(driverGone)));
         QTRY_COMPARE_WITH_TIMEOUT(receiver.uploadFolders().size(), 1, 30000);
         QCOMPARE(receiver.upload(0).file, QByteArray("<html>report</html>"));

@@ -27,7 +27,11 @@ public:
     QString manualProxy() override { return ask("manual", 3); }
 
 private:
-    QString ask(const char *step, int i) { asked << step; return texts.at(i); }
+    QString ask(const char *step, int i)
+    {
+        asked << step;
+        return texts.at(i);
+    }
 };
 
 } // namespace
@@ -43,8 +47,8 @@ private Q_SLOTS:
     void init()
     {
         m_env->clearSettings();
-        for (const char *name : {"https_proxy", "HTTPS_PROXY", "http_proxy", "HTTP_PROXY", "all_proxy", "ALL_PROXY",
-                                 "no_proxy", "NO_PROXY", "CORVID_SERVER"})
+        for (const char *name : {"https_proxy", "HTTPS_PROXY", "http_proxy", "HTTP_PROXY", "all_proxy",
+                                 "ALL_PROXY", "no_proxy", "NO_PROXY", "CORVID_SERVER"})
             qunsetenv(name);
     }
 
@@ -75,7 +79,8 @@ private Q_SLOTS:
         QFETCH(QString, expected);
         {
             Gui::Clip::Settings webUpdate("WebUpdate", true, true, true);
-            for (const auto &[key, value] : {std::pair{"ProxyChoice", choice}, {"ProxyHost", host}, {"ProxyPort", port}})
+            for (const auto &[key, value] :
+                 {std::pair{"ProxyChoice", choice}, {"ProxyHost", host}, {"ProxyPort", port}})
                 if (value.isValid())
                     webUpdate.setValue(key, value);
         }
@@ -95,14 +100,20 @@ private Q_SLOTS:
         QTest::addColumn<QString>("expected");
         QTest::addColumn<QString>("asked");
         const QStringList all{"", "PROXY a:1; DIRECT", "PROXY s:1", "m1:80;m2:80"};
-        QTest::newRow("environment first") << 0xE << QStringList{"e:1", "a", "s", "m"} << "e:1" << "env";
-        QTest::newRow("detection next") << 0xE << all << "a:1" << "env,auto";
-        QTest::newRow("then the script") << 0xE << QStringList{"", "", "PROXY s:1", "m"} << "s:1" << "env,auto,script";
+        QTest::newRow("environment first") << 0xE << QStringList{"e:1", "a", "s", "m"} << "e:1"
+                                           << "env";
+        QTest::newRow("detection next") << 0xE << all << "a:1"
+                                        << "env,auto";
+        QTest::newRow("then the script") << 0xE << QStringList{"", "", "PROXY s:1", "m"} << "s:1"
+                                         << "env,auto,script";
         QTest::newRow("then manual") << 0xE << QStringList{"", "", "", "m1:80;m2:80"} << "m1:80"
                                      << "env,auto,script,manual";
-        QTest::newRow("manual flag only") << 0x2 << all << "m1:80" << "env,manual";
-        QTest::newRow("no flags") << 0 << all << "" << "env";
-        QTest::newRow("script says direct") << 0xE << QStringList{"", "DIRECT", "PROXY s:1", "m"} << "" << "env,auto";
+        QTest::newRow("manual flag only") << 0x2 << all << "m1:80"
+                                          << "env,manual";
+        QTest::newRow("no flags") << 0 << all << ""
+                                  << "env";
+        QTest::newRow("script says direct") << 0xE << QStringList{"", "DIRECT", "PROXY s:1", "m"} << ""
+                                            << "env,auto";
     }
 
     void stepOrder()
@@ -122,12 +133,18 @@ private Q_SLOTS:
     {
         QTest::addColumn<QString>("text");
         QTest::addColumn<QString>("expected");
-        QTest::newRow("script answer") << "PROXY h:8080; DIRECT" << "h:8080";
-        QTest::newRow("proxy list") << "h1:8080;h2:8080" << "h1:8080";
-        QTest::newRow("plain") << "h:8080" << "h:8080";
-        QTest::newRow("blanks") << " \tPROXY \th:1 \t; PROXY h:2" << "h:1";
-        QTest::newRow("direct first") << "DIRECT; PROXY h:1" << "";
-        QTest::newRow("separators only") << ";;" << "";
+        QTest::newRow("script answer") << "PROXY h:8080; DIRECT"
+                                       << "h:8080";
+        QTest::newRow("proxy list") << "h1:8080;h2:8080"
+                                    << "h1:8080";
+        QTest::newRow("plain") << "h:8080"
+                               << "h:8080";
+        QTest::newRow("blanks") << " \tPROXY \th:1 \t; PROXY h:2"
+                                << "h:1";
+        QTest::newRow("direct first") << "DIRECT; PROXY h:1"
+                                      << "";
+        QTest::newRow("separators only") << ";;"
+                                         << "";
     }
 
     void cleanUp()
@@ -148,14 +165,16 @@ private Q_SLOTS:
         QTest::newRow("URL") << QStringList{"https_proxy=http://me:pw@p.example:3128/"} << "p.example:3128";
         // no_proxy against the maker's server, www.vantor.example:443 unless CORVID_SERVER says otherwise.
         const QString p = "https_proxy=p:1";
-        QTest::newRow("no_proxy: the host") << QStringList{p, "no_proxy=a.example, WWW.Vantor.Example"} << "DIRECT";
+        QTest::newRow("no_proxy: the host")
+            << QStringList{p, "no_proxy=a.example, WWW.Vantor.Example"} << "DIRECT";
         QTest::newRow("no_proxy: domain, dot") << QStringList{p, "no_proxy=.vantor.example"} << "DIRECT";
         QTest::newRow("no_proxy: domain") << QStringList{p, "no_proxy=vantor.example"} << "DIRECT";
         QTest::newRow("no_proxy: wildcard") << QStringList{p, "NO_PROXY=*"} << "DIRECT";
         QTest::newRow("no_proxy: port") << QStringList{p, "no_proxy=www.vantor.example:443"} << "DIRECT";
         QTest::newRow("no_proxy: other port") << QStringList{p, "no_proxy=www.vantor.example:8443"} << "p:1";
         QTest::newRow("no_proxy: part of a label") << QStringList{p, "no_proxy=antor.example,www"} << "p:1";
-        QTest::newRow("no_proxy: lower case first") << QStringList{p, "no_proxy=a.example", "NO_PROXY=*"} << "p:1";
+        QTest::newRow("no_proxy: lower case first")
+            << QStringList{p, "no_proxy=a.example", "NO_PROXY=*"} << "p:1";
         QTest::newRow("no_proxy: IPv6")
             << QStringList{p, "CORVID_SERVER=https://[::1]:8443", "no_proxy=[::1]:8443"} << "DIRECT";
         QTest::newRow("no_proxy without a proxy") << QStringList{"no_proxy=*"} << "";
@@ -178,23 +197,28 @@ private Q_SLOTS:
         QTest::addColumn<QStringList>("input");
         QTest::addColumn<QString>("expected"); // flags|script|manual
         const QString head = "[Proxy Settings]\n";
-        QTest::newRow("KDE manual") << "KDE" << QStringList{head + "ProxyType=1\nhttpsProxy=http://p 3128"} << "2||p:3128";
-        QTest::newRow("KDE http proxy") << "KDE" << QStringList{head + "ProxyType=1\nhttpProxy=http://p:81"} << "2||p:81";
+        QTest::newRow("KDE manual") << "KDE" << QStringList{head + "ProxyType=1\nhttpsProxy=http://p 3128"}
+                                    << "2||p:3128";
+        QTest::newRow("KDE http proxy")
+            << "KDE" << QStringList{head + "ProxyType=1\nhttpProxy=http://p:81"} << "2||p:81";
         QTest::newRow("KDE manual, no address") << "KDE" << QStringList{head + "ProxyType=1"} << "0||";
-        QTest::newRow("KDE script") << "KDE" << QStringList{head + "Proxy Config Script=http://c/p.pac\nProxyType=2"}
+        QTest::newRow("KDE script") << "KDE"
+                                    << QStringList{head + "Proxy Config Script=http://c/p.pac\nProxyType=2"}
                                     << "4|http://c/p.pac|";
         QTest::newRow("KDE detect") << "KDE" << QStringList{head + "ProxyType=3"} << "8||";
         QTest::newRow("KDE other group") << "KDE" << QStringList{"[Other]\nProxyType=3\n" + head} << "0||";
         QTest::newRow("KDE named pipe") << "KDE" << QStringList{"FIFO"} << "0||";
-        QTest::newRow("KDE binary") << "KDE" << QStringList{QString::fromLatin1("\xff[Proxy\x01=\x02")} << "0||";
+        QTest::newRow("KDE binary") << "KDE" << QStringList{QString::fromLatin1("\xff[Proxy\x01=\x02")}
+                                    << "0||";
         QTest::newRow("GNOME auto") << "GNOME" << QStringList{"'auto'", "''", "", ""} << "8||";
-        QTest::newRow("GNOME script") << "GNOME" << QStringList{"'auto'", "'http://c/p.pac'", "", ""}
-                                      << "4|http://c/p.pac|";
-        QTest::newRow("GNOME manual") << "GNOME" << QStringList{"'manual'", "", "'p.example'", "3128"}
-                                      << "2||p.example:3128";
+        QTest::newRow("GNOME script")
+            << "GNOME" << QStringList{"'auto'", "'http://c/p.pac'", "", ""} << "4|http://c/p.pac|";
+        QTest::newRow("GNOME manual")
+            << "GNOME" << QStringList{"'manual'", "", "'p.example'", "3128"} << "2||p.example:3128";
         QTest::newRow("GNOME port unset") << "GNOME" << QStringList{"'manual'", "", "'p'", "0"} << "2||p";
         QTest::newRow("GNOME no host") << "GNOME" << QStringList{"'manual'", "", "''", "3128"} << "0||";
-        QTest::newRow("GNOME none") << "GNOME" << QStringList{"'none'", "'http://c/p.pac'", "'p'", "1"} << "0||";
+        QTest::newRow("GNOME none") << "GNOME" << QStringList{"'none'", "'http://c/p.pac'", "'p'", "1"}
+                                    << "0||";
     }
 
     void desktopSettings()
@@ -212,9 +236,11 @@ private Q_SLOTS:
             settings = CrvC_DesktopProxySettings::current();
             qunsetenv("XDG_CURRENT_DESKTOP");
         } else {
-            settings = CrvC_DesktopProxySettings::fromGnomeValues(input.at(0), input.at(1), input.at(2), input.at(3));
+            settings = CrvC_DesktopProxySettings::fromGnomeValues(input.at(0), input.at(1), input.at(2),
+                                                                  input.at(3));
         }
-        QCOMPARE(QString::number(settings.flags) + '|' + settings.scriptUrl + '|' + settings.manualProxy, expected);
+        QCOMPARE(QString::number(settings.flags) + '|' + settings.scriptUrl + '|' + settings.manualProxy,
+                 expected);
     }
 
     void wpadCandidates_data()
@@ -222,7 +248,8 @@ private Q_SLOTS:
         QTest::addColumn<QString>("name");
         QTest::addColumn<QStringList>("expected");
         QTest::newRow("deep") << "pc.dept.corp.example"
-                              << QStringList{"http://wpad.dept.corp.example/wpad.dat", "http://wpad.corp.example/wpad.dat"};
+                              << QStringList{"http://wpad.dept.corp.example/wpad.dat",
+                                             "http://wpad.corp.example/wpad.dat"};
         QTest::newRow("one domain") << "PC.Corp.Example" << QStringList{"http://wpad.corp.example/wpad.dat"};
         QTest::newRow("top-level only") << "pc.example" << QStringList();
     }

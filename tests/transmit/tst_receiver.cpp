@@ -35,12 +35,14 @@ QByteArray chunked(const QByteArray &body)
 {
     QByteArray out;
     for (int at = 0; at < body.size(); at += 1000)
-        out += QByteArray::number(qMin(1000, int(body.size()) - at), 16) + "\r\n" + body.mid(at, 1000) + "\r\n";
+        out +=
+            QByteArray::number(qMin(1000, int(body.size()) - at), 16) + "\r\n" + body.mid(at, 1000) + "\r\n";
     return out + "0\r\n\r\n";
 }
 
-const QByteArray uploadHead = "POST /upload HTTP/1.1\r\nHost: 127.0.0.1\r\n"
-                              "Content-Type: multipart/form-data; boundary=B0und\r\n";
+const QByteArray uploadHead =
+    "POST /upload HTTP/1.1\r\nHost: 127.0.0.1\r\n"
+    "Content-Type: multipart/form-data; boundary=B0und\r\n";
 
 } // namespace
 
@@ -109,7 +111,8 @@ private Q_SLOTS:
         QTest::newRow("chunked") << uploadHead + "Transfer-Encoding: chunked\r\n\r\n" + chunked(upload)
                                  << QByteArray("200 OK") << QByteArray("device_usage_statistics.html");
         QTest::newRow("chunked over the limit")
-            << uploadHead + "Transfer-Encoding: chunked\r\n\r\n" + chunked(big) << QByteArray("413 ") << QByteArray();
+            << uploadHead + "Transfer-Encoding: chunked\r\n\r\n" + chunked(big) << QByteArray("413 ")
+            << QByteArray();
         QTest::newRow("no length") << uploadHead + "\r\n" + upload << QByteArray("411 ") << QByteArray();
         QTest::newRow("length and chunked")
             << uploadHead + "Content-Length: 10\r\nTransfer-Encoding: chunked\r\n\r\n" + chunked(upload)
@@ -121,15 +124,16 @@ private Q_SLOTS:
         QTest::newRow("too many header lines")
             << uploadHead + sized + lines.left(lines.indexOf("X-Line-101")) + "\r\n" + upload
             << QByteArray("431 ") << QByteArray();
-        QTest::newRow("header flood") << uploadHead + sized + lines + "\r\n" + upload << QByteArray("400 ")
-                                      << QByteArray();
+        QTest::newRow("header flood")
+            << uploadHead + sized + lines + "\r\n" + upload << QByteArray("400 ") << QByteArray();
         const QByteArray named = form("fields.txt", report);
         QTest::newRow("upload named fields.txt")
             << uploadHead + "Content-Length: " + QByteArray::number(named.size()) + "\r\n\r\n" + named
             << QByteArray("200 OK") << QByteArray("fields.txt");
         const QByteArray wrongFirst = form("big.html", QByteArray(15000, 'x'), "v9orm", true);
         QTest::newRow("wrong access code before the file")
-            << uploadHead + "Content-Length: " + QByteArray::number(wrongFirst.size()) + "\r\n\r\n" + wrongFirst
+            << uploadHead + "Content-Length: " + QByteArray::number(wrongFirst.size()) + "\r\n\r\n"
+                   + wrongFirst
             << QByteArray("403 ") << QByteArray();
     }
 

@@ -83,7 +83,8 @@ private Q_SLOTS:
         QTest::addColumn<int>("added");
         QTest::addColumn<int>("kept"); // the newest
         QTest::addColumn<int>("pages");
-        QTest::newRow("the 101st entry removes the oldest") << CrvC_SendHistory::MaxBytes << 300 << 101 << 100 << 100;
+        QTest::newRow("the 101st entry removes the oldest")
+            << CrvC_SendHistory::MaxBytes << 300 << 101 << 100 << 100;
         QTest::newRow("stored bytes") << qint64(25000) << 10000 << 4 << 2 << 2;
         QTest::newRow("a page too large to keep") << qint64(5000) << 10000 << 2 << 2 << 0;
     }
@@ -94,12 +95,13 @@ private Q_SLOTS:
         QFETCH(int, pageSize);
         QFETCH(int, added);
         QFETCH(int, kept);
-        CrvC_SendHistory history(CrvC_SendHistory::defaultDirectory(), {CrvC_SendHistory::MaxEntries, maxBytes});
+        CrvC_SendHistory history(CrvC_SendHistory::defaultDirectory(),
+                                 {CrvC_SendHistory::MaxEntries, maxBytes});
         QList<QByteArray> pages;
         for (int i = 0; i < added; ++i) {
             pages << randomPage(pageSize);
-            QVERIFY2(add(history, Method::Upload, QDateTime::currentDateTimeUtc(), 1, State::Sent, pages.last(),
-                         m_env->home() + "/page.html"),
+            QVERIFY2(add(history, Method::Upload, QDateTime::currentDateTimeUtc(), 1, State::Sent,
+                         pages.last(), m_env->home() + "/page.html"),
                      qPrintable(history.error()));
         }
         QList<CrvC_SendHistory::Entry> entries;
@@ -114,7 +116,8 @@ private Q_SLOTS:
         QCOMPARE(history.page(added, &page), entries.first().pageKept);
         QCOMPARE(page, entries.first().pageKept ? pages.last() : QByteArray());
         QCOMPARE(entries.first().bytes, qint64(pageSize));
-        QCOMPARE(entries.first().sha256, QCryptographicHash::hash(pages.last(), QCryptographicHash::Sha256).toHex());
+        QCOMPARE(entries.first().sha256,
+                 QCryptographicHash::hash(pages.last(), QCryptographicHash::Sha256).toHex());
     }
 
     void pending_data()
@@ -145,7 +148,8 @@ private Q_SLOTS:
         QFETCH(bool, retried);
         CrvC_SendHistory history;
         const QDateTime now = QDateTime::currentDateTimeUtc();
-        const qint64 id = add(history, Method(method), now.addSecs(qint64(-ageDays * 86400)), tries, State(last));
+        const qint64 id =
+            add(history, Method(method), now.addSecs(qint64(-ageDays * 86400)), tries, State(last));
         // A newer failed upload: the older one goes first.
         const qint64 newer = add(history, Method::Upload, now.addSecs(-60), 1, State::Failed);
         QList<QPair<qint64, qint64>> claimed;
@@ -171,7 +175,8 @@ private Q_SLOTS:
     {
         QFETCH(bool, collect);
         CrvC_Settings::setValue(CrvC_Settings::CollectDeviceUsage, collect);
-        CrvC_Settings::setValue(CrvC_Settings::CorvidTimeStamp, QDateTime::currentDateTime().toString(Qt::ISODate));
+        CrvC_Settings::setValue(CrvC_Settings::CorvidTimeStamp,
+                                QDateTime::currentDateTime().toString(Qt::ISODate));
         Gui::Clip::Settings("WebUpdate", true, true, true).setValue("ProxyChoice", 0);
         TestServer::putStageBinFirstInPath();
         qputenv("CORVID_SERVER", "https://127.0.0.1:1"); // nobody listens
@@ -184,7 +189,8 @@ private Q_SLOTS:
                                          && entry.attempts.last().state == State::Failed,
                                      30000);
             QVERIFY(entry.attempts.last().automatic);
-            QVERIFY2(entry.outcome().startsWith("failed: Could not connect to 127.0.0.1:1."), qPrintable(entry.outcome()));
+            QVERIFY2(entry.outcome().startsWith("failed: Could not connect to 127.0.0.1:1."),
+                     qPrintable(entry.outcome()));
         } else {
             QTest::qWait(500);
             QVERIFY(history.entry(id, &entry));
@@ -197,7 +203,7 @@ private Q_SLOTS:
         QTest::addColumn<QString>("history"); // "two sends", "none", or the damage done
         QTest::addColumn<QStringList>("arguments");
         QTest::addColumn<int>("exitCode");
-        QTest::addColumn<QString>("output"); // a regular expression
+        QTest::addColumn<QString>("output");   // a regular expression
         QTest::addColumn<int>("entriesAfter"); // -1: not checked
         const QString two = "two sends";
         QTest::newRow("list, newest first")
@@ -205,23 +211,27 @@ private Q_SLOTS:
             << "^ +2  \\d{4}-\\d\\d-\\d\\d \\d\\d:\\d\\d:\\d\\d  upload  h.example +16 bytes  sent\\n"
                " +1  .*e-mail  usage@v.example .*handed to /usr/bin/thunderbird\\n$"
             << 2;
-        QTest::newRow("list --json") << two << QStringList{"list", "--json"} << 0
-                                     << "\"design\": \"led\",\\n *\"destination\": \"https://h.example/upload\","
-                                        "(.|\\n)*\"sha256\": \"[0-9a-f]{64}\",(.|\\n)*\"time\": \"\\d{4}-\\d\\d-\\d\\dT"
-                                     << 2;
+        QTest::newRow("list --json")
+            << two << QStringList{"list", "--json"} << 0
+            << "\"design\": \"led\",\\n *\"destination\": \"https://h.example/upload\","
+               "(.|\\n)*\"sha256\": \"[0-9a-f]{64}\",(.|\\n)*\"time\": \"\\d{4}-\\d\\d-\\d\\dT"
+            << 2;
         QTest::newRow("show") << two << QStringList{"show", "2"} << 0 << "^<HTML>Ä</HTML>\\n$" << 2;
         QTest::newRow("show, no such entry") << two << QStringList{"show", "7"} << 1 << "has no entry 7" << 2;
         QTest::newRow("no history") << "none" << QStringList{"list"} << 0 << "no report has been sent" << 0;
         QTest::newRow("not a database") << "not a database" << QStringList{"list"} << 1
                                         << "history.sqlite is damaged: file is not a database" << -1;
-        QTest::newRow("newer version") << "newer version" << QStringList{"list"} << 1
-                                       << "is damaged: written by a newer version" << -1;
+        QTest::newRow("newer version")
+            << "newer version" << QStringList{"list"} << 1 << "is damaged: written by a newer version" << -1;
         QTest::newRow("page altered") << "page altered" << QStringList{"show", "2"} << 1
                                       << "corvid-history: .* does not match its SHA-256\\n$" << -1;
         QTest::newRow("clear") << two << QStringList{"clear"} << 0 << "cleared" << 0;
-        QTest::newRow("clear a damaged history") << "not a database" << QStringList{"clear"} << 0 << "cleared" << 0;
-        QTest::newRow("usage error") << two << QStringList{"list", "--xml"} << 2 << "list takes only --json" << 2;
-        QTest::newRow("retry an e-mail") << two << QStringList{"retry", "1"} << 1 << "not a failed upload" << 2;
+        QTest::newRow("clear a damaged history")
+            << "not a database" << QStringList{"clear"} << 0 << "cleared" << 0;
+        QTest::newRow("usage error") << two << QStringList{"list", "--xml"} << 2 << "list takes only --json"
+                                     << 2;
+        QTest::newRow("retry an e-mail")
+            << two << QStringList{"retry", "1"} << 1 << "not a failed upload" << 2;
     }
 
     void commandLine()

@@ -49,9 +49,13 @@ private Q_SLOTS:
     void initTestCase()
     {
         m_env.reset(new Environment);
-        Port_MsgManData::setSink([this](const Port_MsgManData::Message &m) { m_debug << QString::fromStdString(m.text); });
+        Port_MsgManData::setSink(
+            [this](const Port_MsgManData::Message &m) { m_debug << QString::fromStdString(m.text); });
         CrvC_UserNotice::setHandlers(
-            [this](const QString &text, const QString &details) { m_warnings << text; m_details << details; },
+            [this](const QString &text, const QString &details) {
+                m_warnings << text;
+                m_details << details;
+            },
             [this](const QString &file) { m_offers << file; });
         Port::StatusLine::setDisplay([this](const QString &text) { m_status << text; });
         TestServer::putStageBinFirstInPath();
@@ -84,10 +88,12 @@ private Q_SLOTS:
         QTest::addColumn<QString>("proxy");
         QTest::addColumn<QString>("lookup");
         const QString path = "/cgi-bin/SW_Docs_Redirect/sw_docs_redirect?topic=corvidupload";
-        QTest::newRow("default server, direct") << QByteArray() << QString() << "https://www.vantor.example" + path;
+        QTest::newRow("default server, direct")
+            << QByteArray() << QString() << "https://www.vantor.example" + path;
         // Whoever answers the lookup chooses where the report goes: always https.
         QTest::newRow("plain http made https, proxy")
-            << QByteArray("http://127.0.0.1:8080/x") << "proxy.example:3128" << "https://127.0.0.1:8080" + path;
+            << QByteArray("http://127.0.0.1:8080/x") << "proxy.example:3128"
+            << "https://127.0.0.1:8080" + path;
     }
 
     void argumentLists()
@@ -98,7 +104,8 @@ private Q_SLOTS:
         if (!server.isEmpty())
             qputenv("CORVID_SERVER", server);
         m_env->writeDataFile("orb_version", "Registration_ID=RID-1\n");
-        const QString bundle = QString::fromUtf8(Port_Env::GetDataFileName("reports/ca-cert-bundle.crt").c_str());
+        const QString bundle =
+            QString::fromUtf8(Port_Env::GetDataFileName("reports/ca-cert-bundle.crt").c_str());
         const QStringList prefix = proxy.isEmpty() ? QStringList{"--cacert", bundle}
                                                    : QStringList{"--proxy", proxy, "--cacert", bundle};
         // Without vancurl on PATH the lookup cannot start: the driver reports
@@ -111,9 +118,10 @@ private Q_SLOTS:
         qputenv("PATH", path);
         QVERIFY(sender);
         QCOMPARE(sender->uploadArguments("https://u.example/upload"),
-                 prefix + QStringList({"-F", "file_loc=@/no such dir/device_usage_statistics.html", "-F",
-                                       "domain=" + CrvC_SendUsingSSL::domainName(), "-F", "regid=RID-1", "-F",
-                                       "access=v9orn", "https://u.example/upload"}));
+                 prefix
+                     + QStringList({"-F", "file_loc=@/no such dir/device_usage_statistics.html", "-F",
+                                    "domain=" + CrvC_SendUsingSSL::domainName(), "-F", "regid=RID-1", "-F",
+                                    "access=v9orn", "https://u.example/upload"}));
         QTRY_VERIFY(sender.isNull());
         QCOMPARE(m_offers, QStringList{"/no such dir/device_usage_statistics.html"});
     }
@@ -122,11 +130,13 @@ private Q_SLOTS:
     {
         QTest::addColumn<QByteArray>("output");
         QTest::addColumn<QString>("address");
-        QTest::newRow("first marked line, later ones ignored")
-            << QByteArray("<html>\n\n<meta content=\"0; URL=https://a.example/u\">\nURL=https://b.example/v\"\n")
-            << "https://a.example/u";
-        QTest::newRow("no quotation mark") << QByteArray("URL=https://h:8443/upload\r\n") << "https://h:8443/upload";
-        QTest::newRow("plain http first, https later") << QByteArray("URL=http://h/u\"\nURL=https://h/u\"\n") << "";
+        QTest::newRow("first marked line, later ones ignored") << QByteArray(
+            "<html>\n\n<meta content=\"0; URL=https://a.example/u\">\nURL=https://b.example/v\"\n")
+                                                               << "https://a.example/u";
+        QTest::newRow("no quotation mark")
+            << QByteArray("URL=https://h:8443/upload\r\n") << "https://h:8443/upload";
+        QTest::newRow("plain http first, https later")
+            << QByteArray("URL=http://h/u\"\nURL=https://h/u\"\n") << "";
         QTest::newRow("https without host") << QByteArray("URL=https:///u\"\n") << "";
         QTest::newRow("space in address") << QByteArray("URL=https://h/u v\"\n") << "";
         QTest::newRow("marker case matters") << QByteArray("url=https://h/u\"\nURL=HTTPS://h/u\"\n") << "";
@@ -166,7 +176,6 @@ private Q_SLOTS:
             storeRegistration(registration);
         QVERIFY(m_env->writeDataFile("orb_version", versionFile));
         QTEST(CrvC_SendUsingSSL::registrationId(), "id");
-
     }
 
     void sends_data()
@@ -174,37 +183,44 @@ private Q_SLOTS:
         QTest::addColumn<QStringList>("receiverArguments");
         QTest::addColumn<bool>("stopReceiver");
         QTest::addColumn<QByteArray>("vancurl"); // empty: the staged one; "none": not on PATH; else a script
-        QTest::addColumn<QString>("bundle");     // the test CA: "installation", "system" (SSL_CERT_FILE), "none"
+        QTest::addColumn<QString>("bundle"); // the test CA: "installation", "system" (SSL_CERT_FILE), "none"
         QTest::addColumn<QString>("proxy");
         QTest::addColumn<int>("reportSize");
         QTest::addColumn<QString>("cause"); // beneath the warning, %1 the server; empty: delivered
         const QStringList none;
         const QString inst = "installation";
         QTest::newRow("delivered") << none << false << QByteArray() << inst << "" << 70000 << "";
-        QTest::newRow("no bundle installed: the system's store")
-            << none << false << QByteArray() << "system" << "" << 100 << "";
-        QTest::newRow("server not trusted") << none << false << QByteArray() << "none" << "" << 100
-                                            << "The certificate of the server %1 could not be verified.";
-        QTest::newRow("page without an address") << QStringList{"--no-redirect"} << false << QByteArray() << inst
-                                                 << "" << 100 << "The server %1 named no upload address.";
+        QTest::newRow("no bundle installed: the system's store") << none << false << QByteArray() << "system"
+                                                                 << "" << 100 << "";
+        QTest::newRow("server not trusted")
+            << none << false << QByteArray() << "none"
+            << "" << 100 << "The certificate of the server %1 could not be verified.";
+        QTest::newRow("page without an address")
+            << QStringList{"--no-redirect"} << false << QByteArray() << inst << "" << 100
+            << "The server %1 named no upload address.";
         // Sent again by corvid-history once the receiver is back.
-        QTest::newRow("receiver stopped") << none << true << QByteArray() << inst << "" << 100
-                                          << "Could not connect to %1.";
-        QTest::newRow("proxy refuses") << none << false << QByteArray() << inst << "127.0.0.1:1" << 100
-                                       << "The proxy 127.0.0.1:1 could not be reached or refused the connection to %1.";
-        QTest::newRow("upload refused") << QStringList{"--max-bytes", "2000"} << false << QByteArray() << inst << ""
-                                        << 5000 << "The server %1 refused the report with HTTP 413.";
+        QTest::newRow("receiver stopped")
+            << none << true << QByteArray() << inst << "" << 100 << "Could not connect to %1.";
+        QTest::newRow("proxy refuses")
+            << none << false << QByteArray() << inst << "127.0.0.1:1" << 100
+            << "The proxy 127.0.0.1:1 could not be reached or refused the connection to %1.";
+        QTest::newRow("upload refused") << QStringList{"--max-bytes", "2000"} << false << QByteArray() << inst
+                                        << "" << 5000 << "The server %1 refused the report with HTTP 413.";
         QTest::newRow("vancurl not found") << none << false << QByteArray("none") << inst << "" << 100
                                            << "The transfer tool vancurl could not be started: ";
         // Statuses and reasons a later vancurl may give.
-        QTest::newRow("timed out") << none << false << QByteArray("echo 'vancurl: Operation timed out' >&2; exit 4")
-                                   << inst << "" << 100 << "The connection to %1 timed out.";
-        QTest::newRow("redirect answered") << none << false << QByteArray("echo 'vancurl: HTTP status 302' >&2; exit 8")
-                                           << inst << "" << 100 << "The server %1 answered the address lookup with HTTP 302.";
-        QTest::newRow("time limit") << none << false << QByteArray("echo 'vancurl: took longer' >&2; exit 9") << inst
-                                    << "" << 100 << "The transfer to %1 took longer than its time limit.";
-        QTest::newRow("unknown status") << none << false << QByteArray("echo 'vancurl: odd' >&2; exit 12") << inst
-                                        << "" << 100 << "The transfer to %1 failed (exit status 12): odd";
+        QTest::newRow("timed out") << none << false
+                                   << QByteArray("echo 'vancurl: Operation timed out' >&2; exit 4") << inst
+                                   << "" << 100 << "The connection to %1 timed out.";
+        QTest::newRow("redirect answered")
+            << none << false << QByteArray("echo 'vancurl: HTTP status 302' >&2; exit 8") << inst << "" << 100
+            << "The server %1 answered the address lookup with HTTP 302.";
+        QTest::newRow("time limit") << none << false << QByteArray("echo 'vancurl: took longer' >&2; exit 9")
+                                    << inst << "" << 100
+                                    << "The transfer to %1 took longer than its time limit.";
+        QTest::newRow("unknown status")
+            << none << false << QByteArray("echo 'vancurl: odd' >&2; exit 12") << inst << "" << 100
+            << "The transfer to %1 failed (exit status 12): odd";
     }
 
     void sends()
@@ -250,9 +266,10 @@ private Q_SLOTS:
         QTRY_COMPARE_WITH_TIMEOUT(m_status.size(), 1, 30000);
         const QString server127 = QUrl(server.baseUrl()).authority();
         if (cause.isEmpty())
-            QVERIFY2(m_status.first().startsWith("Usage report sent to 127.0.0.1, ")
-                         && m_status.first().endsWith(" KB \u2014 Edit > Preferences > Corvid > Sent reports"),
-                     qPrintable(m_status.first()));
+            QVERIFY2(
+                m_status.first().startsWith("Usage report sent to 127.0.0.1, ")
+                    && m_status.first().endsWith(" KB \u2014 Edit > Preferences > Corvid > Sent reports"),
+                qPrintable(m_status.first()));
         else
             QVERIFY2(m_status.first().startsWith("Usage report not sent: "
                                                  + (cause.contains("%1") ? cause.arg(server127) : cause)),
@@ -294,9 +311,9 @@ private Q_SLOTS:
             // Back, on another port: the retry asks today's server.
             QVERIFY2(server.start(), qPrintable(server.error()));
             Gui::Clip::Settings("WebUpdate", true, true, true).setValue("ProxyChoice", 0);
-            const ToolRun retry = runStaged("corvid-history", {"retry", QString::number(entries.first().id)},
-                                            m_env->home(),
-                                            Environment::locations() << "CORVID_SERVER=" + server.baseUrl());
+            const ToolRun retry =
+                runStaged("corvid-history", {"retry", QString::number(entries.first().id)}, m_env->home(),
+                          Environment::locations() << "CORVID_SERVER=" + server.baseUrl());
             QVERIFY2(retry.exitCode == 0 && retry.output.startsWith("Usage report sent to 127.0.0.1"),
                      qPrintable(QString::number(retry.exitCode) + retry.output));
             QCOMPARE(server.uploadFolders().size(), 1);
@@ -311,8 +328,9 @@ private Q_SLOTS:
     {
         // A lookup that pours out data is stopped, not buffered in the host.
         const QString fake = m_env->home() + "/fakebin/vancurl";
-        QVERIFY(writeFile(fake, "#!/bin/sh\nhead -c 3000000 /dev/zero | tr '\\0' x\n"
-                                "printf '\\nURL=https://h.example/u\"\\n'\n"));
+        QVERIFY(writeFile(fake,
+                          "#!/bin/sh\nhead -c 3000000 /dev/zero | tr '\\0' x\n"
+                          "printf '\\nURL=https://h.example/u\"\\n'\n"));
         QVERIFY(QFile::setPermissions(fake, QFile::ReadOwner | QFile::WriteOwner | QFile::ExeOwner));
         send("/r.html", QFile::encodeName(m_env->home() + "/fakebin:") + qgetenv("PATH"));
         QCOMPARE(m_offers, QStringList{"/r.html"});

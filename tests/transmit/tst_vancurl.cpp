@@ -56,7 +56,8 @@ private Q_SLOTS:
         QVERIFY2(m_server->start({"--max-bytes", "20000"}), qPrintable(m_server->error()));
         m_moved.reset(new TestServer);
         QVERIFY2(m_moved->start({"--moved", "https://127.0.0.1:9/upload"}), qPrintable(m_moved->error()));
-        QVERIFY2(m_otherCa.create(m_server->scratchDir() + "/other", "Other CA"), qPrintable(m_otherCa.error()));
+        QVERIFY2(m_otherCa.create(m_server->scratchDir() + "/other", "Other CA"),
+                 qPrintable(m_otherCa.error()));
         m_report = m_server->scratchDir() + "/device_usage_statistics.html";
         QVERIFY(writeFile(m_report, QByteArray("<html>\r\n\xc3\xa4\0\xff</html>\n", 20)));
         QVERIFY(writeFile(m_server->scratchDir() + "/big.html", QByteArray(30000, 'x')));
@@ -95,7 +96,8 @@ private Q_SLOTS:
         QTest::newRow("system CAs only") << "{LOOKUP}" << 5 << "" << 0 << "";
         QTest::newRow("CA file missing") << "--cacert {CA}.missing {LOOKUP}" << 5 << "" << 0 << "";
         QTest::newRow("upload file missing")
-            << "--cacert {CA} -F file_loc=@{REPORT}.missing -F access=v9orn {URL}/upload" << 3 << "" << 0 << "";
+            << "--cacert {CA} -F file_loc=@{REPORT}.missing -F access=v9orn {URL}/upload" << 3 << "" << 0
+            << "";
         QTest::newRow("option without value") << "{LOOKUP} --proxy" << 2 << "" << 0 << "";
         QTest::newRow("unknown option") << "--insecure {LOOKUP}" << 2 << "" << 0 << "";
         QTest::newRow("other scheme") << "file:///etc/hostname" << 2 << "" << 0 << "";
@@ -140,7 +142,8 @@ private Q_SLOTS:
         const QString next = dir + QString("%1").arg(before + 1, 6, 10, QLatin1Char('0'));
         QVERIFY(writeFile(next + "/" + TestServer::fieldsFileName(), "earlier\n"));
         QVERIFY(QDir().mkpath(dir + "100000"));
-        const QString upload = "--cacert {CA} -F file_loc=@{REPORT} -F domain=x.y -F access=v9orn {URL}/upload";
+        const QString upload =
+            "--cacert {CA} -F file_loc=@{REPORT} -F domain=x.y -F access=v9orn {URL}/upload";
         QCOMPARE(vancurl(upload), 0);
         QCOMPARE(vancurl(upload), 0);
         QCOMPARE(readFile(next + "/" + TestServer::fieldsFileName()), QByteArray("earlier\n"));

@@ -15,14 +15,14 @@ struct SendRecorder
 {
     SendRecorder()
     {
-        CrvC_SendDispatcher::setStarter([this](CrvC_SendDispatcher::Method method, const QString &tool,
-                                               const QString &file) {
-            sends << (method == CrvC_SendDispatcher::Method::Upload ? QStringLiteral("upload")
-                                                                    : QLatin1String("email ") + tool);
-            files << file;
-            QFile page(file);
-            pages << (page.open(QIODevice::ReadOnly) ? page.readAll() : QByteArray());
-        });
+        CrvC_SendDispatcher::setStarter(
+            [this](CrvC_SendDispatcher::Method method, const QString &tool, const QString &file) {
+                sends << (method == CrvC_SendDispatcher::Method::Upload ? QStringLiteral("upload")
+                                                                        : QLatin1String("email ") + tool);
+                files << file;
+                QFile page(file);
+                pages << (page.open(QIODevice::ReadOnly) ? page.readAll() : QByteArray());
+            });
     }
     ~SendRecorder() { CrvC_SendDispatcher::setStarter(nullptr); }
     QStringList sends;

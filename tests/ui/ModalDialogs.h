@@ -11,7 +11,7 @@ namespace CorvidTest {
 // Runs `action` on the next modal dialog of class T to open; polls the event
 // loop, so call it before the code that opens the dialog. Delete the answer
 // when no dialog may have come.
-template <typename T>
+template<typename T>
 QPointer<QTimer> onNextModal(std::function<void(T *)> action)
 {
     auto *timer = new QTimer;

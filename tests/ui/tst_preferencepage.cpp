@@ -1,12 +1,12 @@
-#include "common/TestEnvironment.h"
 #include "DialogTestSupport.h"
+#include "common/TestEnvironment.h"
 #include "host/gui/DataCollector.h"
 #include "host/gui/PropItem.h"
 #include "host/gui/PropSheet.h"
 #include "host/gui/PropSheetEvent.h"
 #include "host/gui/VantorUpdatePage.h"
-#include "ui/DataCollectionPropPageImpl.h"
 #include "transmit/DataCollectionEmail.h"
+#include "ui/DataCollectionPropPageImpl.h"
 #include "ui/PropPageCreator.h"
 
 #include <QLabel>
@@ -70,13 +70,14 @@ private Q_SLOTS:
         QTest::addColumn<bool>("administrator");   // the note that the installation decides
 
         const QVariant none;
-        QTest::newRow("defaults, unchanged") << none << QByteArray() << false << true << none << false << false;
-        QTest::newRow("installation switched off")
-            << none << QByteArray("collectusagestatistics=false\n") << false << false << none << false << true;
-        QTest::newRow("upload to e-mail") << QVariant(true) << QByteArray() << true << true << QVariant(false) << false
-                                          << false;
-        QTest::newRow("program remembered") << QVariant(false) << QByteArray() << false << true << QVariant(false)
-                                            << true << false;
+        QTest::newRow("defaults, unchanged")
+            << none << QByteArray() << false << true << none << false << false;
+        QTest::newRow("installation switched off") << none << QByteArray("collectusagestatistics=false\n")
+                                                   << false << false << none << false << true;
+        QTest::newRow("upload to e-mail")
+            << QVariant(true) << QByteArray() << true << true << QVariant(false) << false << false;
+        QTest::newRow("program remembered")
+            << QVariant(false) << QByteArray() << false << true << QVariant(false) << true << false;
     }
 
     void loadAndApply()

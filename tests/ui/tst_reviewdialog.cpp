@@ -1,6 +1,6 @@
-#include "common/TestEnvironment.h"
 #include "DialogTestSupport.h"
 #include "ModalDialogs.h"
+#include "common/TestEnvironment.h"
 #include "project/ProjectRepositoryValues.h"
 #include "transmit/MakerServer.h"
 #include "transmit/SendUsingSSL.h"
@@ -67,8 +67,8 @@ private Q_SLOTS:
         QTest::newRow("close") << "close" << int(QDialog::Rejected) << QString() << intro;
         QTest::newRow("Enter, then close") << "enter" << int(QDialog::Rejected) << QString() << intro;
         // These two only change the tab; the dialog is then declined.
-        QTest::newRow("Verify Contents") << "verify" << int(QDialog::Rejected) << QString()
-                                         << int(CrvC_DataCollectionDialog::ContentsTab);
+        QTest::newRow("Verify Contents")
+            << "verify" << int(QDialog::Rejected) << QString() << int(CrvC_DataCollectionDialog::ContentsTab);
         QTest::newRow("Help") << "help" << int(QDialog::Rejected) << QString()
                               << int(CrvC_DataCollectionDialog::HelpTab);
     }
@@ -124,7 +124,8 @@ private Q_SLOTS:
         QVERIFY(introduction.isLocalFile());
 
         // Introduction: the link opens in the browser, the page stays.
-        Q_EMIT dialog.introductionViewer()->anchorClicked(QUrl(QStringLiteral("https://www.vantor.example/corvid")));
+        Q_EMIT dialog.introductionViewer()->anchorClicked(
+            QUrl(QStringLiteral("https://www.vantor.example/corvid")));
         QCOMPARE(m_opened, QStringList{QStringLiteral("https://www.vantor.example/corvid")});
         QCOMPARE(dialog.introductionViewer()->source(), introduction);
 
@@ -161,7 +162,8 @@ private Q_SLOTS:
         QTest::addColumn<QString>("typed"); // null: the prompt is cancelled
         QTest::addColumn<QString>("design");
 
-        QTest::newRow("typed with blanks") << "  led  " << "led";
+        QTest::newRow("typed with blanks") << "  led  "
+                                           << "led";
         QTest::newRow("cancelled: nothing written, sent or counted") << QString() << QString();
     }
 
@@ -170,7 +172,8 @@ private Q_SLOTS:
         QFETCH(QString, typed);
         QFETCH(QString, design);
         // A design "led" with a synthesis report that names its device.
-        CorvidTest::writeFile(QStringLiteral("led_map.ktp"), "Target Device  : ks3s500\nTarget Package : fg320\n");
+        CorvidTest::writeFile(QStringLiteral("led_map.ktp"),
+                              "Target Device  : ks3s500\nTarget Package : fg320\n");
         CorvidTest::onNextModal<QInputDialog>([&](QInputDialog *prompt) {
             if (typed.isNull()) {
                 prompt->reject();
@@ -204,7 +207,8 @@ private Q_SLOTS:
 
         QTest::newRow("upload") << true << QVariant() << "HTTPS upload to " + CrvC_MakerServer::host() + ",";
         QTest::newRow("e-mail") << false << QVariant("/usr/bin/mutt")
-            << "E-mail to " + CrvC_SendDispatcher::emailRecipient() + " with /usr/bin/mutt";
+                                << "E-mail to " + CrvC_SendDispatcher::emailRecipient()
+                                       + " with /usr/bin/mutt";
         QTest::newRow("no mail program: asked") << false << QVariant() << "You choose how";
     }
 
@@ -235,10 +239,11 @@ private Q_SLOTS:
         QTest::addColumn<QStringList>("shown");
 
         QTest::newRow("usage values") << "top_usage.xml"
-                                      << QByteArray("<DeviceUsageReport><DeviceUsage><group name='G'>"
-                                                    "<item name='count&lt;3&gt;' value='1'/><item name='n' "
-                                                    "value='&lt;!--'/><item name='after' value='7'/>"
-                                                    "</group></DeviceUsage></DeviceUsageReport>")
+                                      << QByteArray(
+                                             "<DeviceUsageReport><DeviceUsage><group name='G'>"
+                                             "<item name='count&lt;3&gt;' value='1'/><item name='n' "
+                                             "value='&lt;!--'/><item name='after' value='7'/>"
+                                             "</group></DeviceUsage></DeviceUsageReport>")
                                       << QStringList{"count<3>=1", "n=<!--", "after=7"};
         QTest::newRow("title in a page") << "par_usage_statistics.html" << QByteArray("<TITLE>kept</TITLE>")
                                          << QStringList{"<TITLE>kept</TITLE>"};
@@ -282,8 +287,10 @@ private Q_SLOTS:
         const QString text = CrvC_DataCollectionDialog::contentsText(page);
         const qsizetype notice = text.indexOf(QLatin1String("<P><B>"));
         const qsizetype noticeEnd = text.indexOf(QLatin1String("<HR>"), notice) + 4;
-        QVERIFY(text.left(notice).endsWith(QLatin1Char('>')) && text.left(notice).contains(QLatin1String("<BODY")));
-        QVERIFY(text.mid(notice, noticeEnd - notice).contains(QLatin1String(CrvC_DataCollectionDialog::BrowseContentsUrl)));
+        QVERIFY(text.left(notice).endsWith(QLatin1Char('>'))
+                && text.left(notice).contains(QLatin1String("<BODY")));
+        QVERIFY(text.mid(notice, noticeEnd - notice)
+                    .contains(QLatin1String(CrvC_DataCollectionDialog::BrowseContentsUrl)));
         const QString shown = text.left(notice) + text.mid(noticeEnd);
         QVERIFY(page.startsWith(shown));
         QCOMPARE(page.at(shown.size()), QLatin1Char('\n'));

@@ -1,5 +1,5 @@
-#include "common/TestEnvironment.h"
 #include "DialogTestSupport.h"
+#include "common/TestEnvironment.h"
 #include "project/PreferenceValues.h"
 
 #include <QtTest>
@@ -84,13 +84,14 @@ private Q_SLOTS:
         QTest::addColumn<QVariant>("storedSsl");
         QTest::addColumn<QVariant>("storedTool");
         const QVariant none;
-        QTest::newRow("e-mail with a program") << QByteArray() << true << false << "b" << QVariant(false) << QVariant("b");
+        QTest::newRow("e-mail with a program")
+            << QByteArray() << true << false << "b" << QVariant(false) << QVariant("b");
         // The user's apply is newer than the installation's switch either way.
-        QTest::newRow("installation off, user on") << QByteArray("collectusagestatistics=false\n") << true << true << ""
-                                                   << none << none;
+        QTest::newRow("installation off, user on")
+            << QByteArray("collectusagestatistics=false\n") << true << true << "" << none << none;
         QTest::newRow("installation on, user off")
-            << QByteArray("collectusagestatistics=true\ntimestamp=2020-01-01T00:00:00\n") << false << true << "" << none
-            << none;
+            << QByteArray("collectusagestatistics=true\ntimestamp=2020-01-01T00:00:00\n") << false << true
+            << "" << none << none;
     }
 
     void preferenceApply()

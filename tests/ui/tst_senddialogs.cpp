@@ -1,14 +1,14 @@
-#include "common/TestEnvironment.h"
 #include "DialogTestSupport.h"
 #include "ModalDialogs.h"
+#include "common/TestEnvironment.h"
+#include "report/BackgroundBuild.h"
+#include "transmit/DataCollectionEmail.h"
 #include "ui/DataCollectionDialog.h"
 #include "ui/DataCollectionHtmlViewer.h"
 #include "ui/SendClipDlg.h"
 #include "ui/SendClipDlgImp.h"
 #include "ui/SendToClipDlg.h"
 #include "ui/SendToClipDlgImp.h"
-#include "report/BackgroundBuild.h"
-#include "transmit/DataCollectionEmail.h"
 
 #include <QDir>
 #include <QSemaphore>
@@ -21,7 +21,10 @@ using CorvidTest::stored;
 class HeldBuilds
 {
 public:
-    HeldBuilds() { CrvC_BackgroundBuild::setStartHook([this] { m_gate.acquire(); }); }
+    HeldBuilds()
+    {
+        CrvC_BackgroundBuild::setStartHook([this] { m_gate.acquire(); });
+    }
     ~HeldBuilds() { finish(); }
     // Lets one build go and waits, events running, until `review` has its page.
     bool release(CrvC_DataCollectionDialog *review)
@@ -88,12 +91,16 @@ private Q_SLOTS:
         QTest::addColumn<bool>("boxChecked");
 
         const QVariant none, yes(true), no(false);
-        QTest::newRow("nothing stored: no dialog") << none << none << none << "ask" << true << false << false << false;
-        QTest::newRow("e-mail stored") << no << none << QVariant("mutt") << "ask" << true << true << true << true;
+        QTest::newRow("nothing stored: no dialog")
+            << none << none << none << "ask" << true << false << false << false;
+        QTest::newRow("e-mail stored")
+            << no << none << QVariant("mutt") << "ask" << true << true << true << true;
         QTest::newRow("automatic, no program") << no << yes << none << "ask" << true << true << true << true;
         // After a failure the choice is for this report: the box starts cleared.
-        QTest::newRow("after a failed upload") << none << yes << none << "email" << true << true << true << false;
-        QTest::newRow("e-mail stored, no mail program") << no << none << none << "ask" << false << true << false << true;
+        QTest::newRow("after a failed upload")
+            << none << yes << none << "email" << true << true << true << false;
+        QTest::newRow("e-mail stored, no mail program")
+            << no << none << none << "ask" << false << true << false << true;
         QTest::newRow("after a failed upload, no mail program")
             << none << none << none << "email" << false << true << false << false;
     }
@@ -152,8 +159,10 @@ private Q_SLOTS:
 
         const QVariant none;
         // The program shown differs from the none remembered: it is stored too.
-        QTest::newRow("OK, unchanged") << "ok" << false << true << true << none << QVariant(true) << true << "upload";
-        QTest::newRow("failure offer, OK") << "ok" << true << true << false << none << none << false << "email";
+        QTest::newRow("OK, unchanged")
+            << "ok" << false << true << true << none << QVariant(true) << true << "upload";
+        QTest::newRow("failure offer, OK")
+            << "ok" << true << true << false << none << none << false << "email";
         QTest::newRow("failure offer, ticked, OK")
             << "ok" << true << true << true << QVariant(false) << QVariant(true) << true << "email";
         // No mail program: the upload is the one choice left, for this report.
@@ -203,14 +212,22 @@ private Q_SLOTS:
         QTest::addColumn<int>("sends");
         QTest::addColumn<bool>("boxStored");
 
-        QTest::newRow("five ticks") << "ticks" << "at once" << false << 1 << true;
-        QTest::newRow("five ticks, page late: sent once written") << "ticks" << "late" << false << 1 << true;
-        QTest::newRow("Details, declined") << "details" << "at once" << false << 0 << false;
-        QTest::newRow("Details during the build, declined") << "details" << "in review" << false << 0 << false;
-        QTest::newRow("Cancel, sent in the review") << "cancel" << "at once" << true << 1 << false;
-        QTest::newRow("Cancel during the build, sent once shown") << "cancel" << "in review" << true << 1 << false;
-        QTest::newRow("window closed") << "close" << "at once" << false << 0 << false;
-        QTest::newRow("window closed during the build") << "close" << "after" << false << 0 << false;
+        QTest::newRow("five ticks") << "ticks"
+                                    << "at once" << false << 1 << true;
+        QTest::newRow("five ticks, page late: sent once written") << "ticks"
+                                                                  << "late" << false << 1 << true;
+        QTest::newRow("Details, declined") << "details"
+                                           << "at once" << false << 0 << false;
+        QTest::newRow("Details during the build, declined") << "details"
+                                                            << "in review" << false << 0 << false;
+        QTest::newRow("Cancel, sent in the review") << "cancel"
+                                                    << "at once" << true << 1 << false;
+        QTest::newRow("Cancel during the build, sent once shown") << "cancel"
+                                                                  << "in review" << true << 1 << false;
+        QTest::newRow("window closed") << "close"
+                                       << "at once" << false << 0 << false;
+        QTest::newRow("window closed during the build") << "close"
+                                                        << "after" << false << 0 << false;
     }
 
     void countdown()
@@ -220,8 +237,8 @@ private Q_SLOTS:
         QFETCH(bool, sendInReview);
         CorvidTest::SendRecorder recorder;
         HeldBuilds held;
-        QPointer<CrvC_SendClipDlg> dialog =
-            new CrvC_SendClipDlg(nullptr, m_env->home() + QLatin1String("/p.orb"), QStringLiteral("top"), QString());
+        QPointer<CrvC_SendClipDlg> dialog = new CrvC_SendClipDlg(
+            nullptr, m_env->home() + QLatin1String("/p.orb"), QStringLiteral("top"), QString());
         QVERIFY(dialog->timer()->isActive());
         dialog->show();
         QVERIFY(!dialog->reviewDialog()->reportReady());
@@ -237,15 +254,17 @@ private Q_SLOTS:
 
         bool reviewed = false, shownWhenReady = true;
         CrvC_SendClipDlg *countdown = dialog;
-        QPointer<QTimer> poll = CorvidTest::onNextModal<CrvC_DataCollectionDialog>([&](CrvC_DataCollectionDialog *review) {
-            reviewed = review == countdown->reviewDialog() && !countdown->timer()->isActive();
-            if (built == QLatin1String("in review")) {
-                const auto page = [review] { return review->contentsViewer()->toPlainText(); };
-                shownWhenReady = !page().contains(QLatin1String("Device Usage Page")) && !review->sendButton()->isEnabled()
-                                 && held.release(review) && page().contains(QLatin1String("Device Usage Page"));
-            }
-            (sendInReview ? review->sendButton() : review->declineButton())->click();
-        });
+        QPointer<QTimer> poll =
+            CorvidTest::onNextModal<CrvC_DataCollectionDialog>([&](CrvC_DataCollectionDialog *review) {
+                reviewed = review == countdown->reviewDialog() && !countdown->timer()->isActive();
+                if (built == QLatin1String("in review")) {
+                    const auto page = [review] { return review->contentsViewer()->toPlainText(); };
+                    shownWhenReady = !page().contains(QLatin1String("Device Usage Page"))
+                                     && !review->sendButton()->isEnabled() && held.release(review)
+                                     && page().contains(QLatin1String("Device Usage Page"));
+                }
+                (sendInReview ? review->sendButton() : review->declineButton())->click();
+            });
         if (end == QLatin1String("ticks"))
             dialog->OnTimeOut();
         else if (end == QLatin1String("details"))
@@ -299,9 +318,8 @@ private Q_SLOTS:
         const QString project = QDir::currentPath();
         const QString secondCopy = cycles.last()->reviewDialog()->builder().pagePath();
         if (declineSecond) {
-            CorvidTest::onNextModal<CrvC_DataCollectionDialog>([](CrvC_DataCollectionDialog *review) {
-                review->declineButton()->click();
-            });
+            CorvidTest::onNextModal<CrvC_DataCollectionDialog>(
+                [](CrvC_DataCollectionDialog *review) { review->declineButton()->click(); });
             cycles.last()->imp()->detailsButton->click();
             QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
         }

@@ -32,16 +32,16 @@
 #include <QApplication>
 #include <QDir>
 #include <QElapsedTimer>
+#include <QEventLoop>
 #include <QFile>
 #include <QFileInfo>
-#include <QEventLoop>
 #include <QPointer>
 #include <QProcess>
 #include <QPushButton>
-#include <QTimer>
-#include <QUrl>
 #include <QStandardPaths>
 #include <QTemporaryDir>
+#include <QTimer>
+#include <QUrl>
 
 #include <sys/resource.h>
 #include <time.h>
@@ -63,8 +63,8 @@ struct Sizes
 
 Sizes sizesFor(double scale, double usageScale)
 {
-    return {int(200000 * scale), int(800000 * scale * usageScale), int(20000 * scale),
-            int(20000 * scale), int(50000 * scale)};
+    return {int(200000 * scale), int(800000 * scale * usageScale), int(20000 * scale), int(20000 * scale),
+            int(50000 * scale)};
 }
 
 // Writes a file in chunks so that generating 50 MB needs little memory.
@@ -100,10 +100,18 @@ bool generate(const QString &dir, const QString &design, const Sizes &s, qint64 
     ok &= writeChunks(base + QLatin1String(".cmd_log"), [&](QByteArray &c) {
         for (int i = 0; i < 5000 && line < s.commandLines; ++i, ++line) {
             switch (line % 4) {
-            case 0: c += "synth -ifn \"" + design.toUtf8() + ".prj\" -ofn " + design.toUtf8() + ".ngc\n"; break;
-            case 1: c += "map -o " + design.toUtf8() + "_map.ncd " + design.toUtf8() + ".ngd -w\n"; break;
-            case 2: c += "par -w -ol high " + design.toUtf8() + "_map.ncd " + design.toUtf8() + ".ncd\n"; break;
-            default: c += "bitgen -w \"C:/work/" + design.toUtf8() + "/" + design.toUtf8() + ".ut\" x.bit\n"; break;
+            case 0:
+                c += "synth -ifn \"" + design.toUtf8() + ".prj\" -ofn " + design.toUtf8() + ".ngc\n";
+                break;
+            case 1:
+                c += "map -o " + design.toUtf8() + "_map.ncd " + design.toUtf8() + ".ngd -w\n";
+                break;
+            case 2:
+                c += "par -w -ol high " + design.toUtf8() + "_map.ncd " + design.toUtf8() + ".ncd\n";
+                break;
+            default:
+                c += "bitgen -w \"C:/work/" + design.toUtf8() + "/" + design.toUtf8() + ".ut\" x.bit\n";
+                break;
             }
         }
         return line < s.commandLines;
@@ -125,12 +133,14 @@ bool generate(const QString &dir, const QString &design, const Sizes &s, qint64 
                 c += QByteArray("<") + sections[section] + ">\n";
             if (item % 50 == 0) {
                 const bool net = section == 0 && item % 1000 == 0;
-                c += "<group name=\"" + QByteArray(net ? "NetStatistics" : "Group") + QByteArray::number(item) + "\">\n";
+                c += "<group name=\"" + QByteArray(net ? "NetStatistics" : "Group") + QByteArray::number(item)
+                     + "\">\n";
             }
             if (item % 3 == 0)
                 c += "<item name=\"Slice LUTs\" value=\"" + QByteArray::number(item) + "\"/>\n";
             else
-                c += "<item name=\"Registers\"><attrib name=\"used\" value=\"12\"/><attrib name=\"total\" value=\"100\"/></item>\n";
+                c += "<item name=\"Registers\"><attrib name=\"used\" value=\"12\"/><attrib name=\"total\" "
+                     "value=\"100\"/></item>\n";
             ++item;
             if (item % 50 == 0 || item == perSection)
                 c += "</group>\n";
@@ -177,10 +187,12 @@ bool generate(const QString &dir, const QString &design, const Sizes &s, qint64 
         }
         for (int i = 0; i < 2000 && help < s.helpEntries; ++i, ++help) {
             if (help % 3 == 2)
-                c += "<OpenHelpFile count=\"" + QByteArray::number(help % 17) + "\">topic" + QByteArray::number(help) + ".htm</OpenHelpFile>\n";
+                c += "<OpenHelpFile count=\"" + QByteArray::number(help % 17) + "\">topic"
+                     + QByteArray::number(help) + ".htm</OpenHelpFile>\n";
             else
                 c += "<SearchString found=\"" + QByteArray(help % 3 ? "false" : "true") + "\" count=\""
-                     + QByteArray::number(help % 9) + "\">search " + QByteArray::number(help) + "</SearchString>\n";
+                     + QByteArray::number(help % 9) + "\">search " + QByteArray::number(help)
+                     + "</SearchString>\n";
         }
         if (help >= s.helpEntries)
             c += "</HelpViewerData>\n";
@@ -191,16 +203,19 @@ bool generate(const QString &dir, const QString &design, const Sizes &s, qint64 
     bool macroHeader = false;
     ok &= writeChunks(base + QLatin1String(".snx"), [&](QByteArray &c) {
         if (!macroHeader) {
-            c += "Synthesis log\n\n=========================================================================\n"
-                 "Advanced HDL Synthesis Report\n\nMacro Statistics\n"
-                 "=========================================================================\n\n";
+            c +=
+                "Synthesis log\n\n=========================================================================\n"
+                "Advanced HDL Synthesis Report\n\nMacro Statistics\n"
+                "=========================================================================\n\n";
             macroHeader = true;
         }
         for (int i = 0; i < 5000 && macro < s.macroLines; ++i, ++macro) {
             if (macro % 20 == 0)
-                c += "# Registers                                          : " + QByteArray::number(macro) + "\n";
+                c += "# Registers                                          : " + QByteArray::number(macro)
+                     + "\n";
             else
-                c += " Flip-Flops                                           : " + QByteArray::number(macro) + "\n";
+                c += " Flip-Flops                                           : " + QByteArray::number(macro)
+                     + "\n";
         }
         if (macro >= s.macroLines)
             c += "\n=========================================================================\n";
@@ -246,7 +261,7 @@ qint64 cpuMs()
     rusage usage{};
     getrusage(RUSAGE_SELF, &usage);
     return qint64(usage.ru_utime.tv_sec + usage.ru_stime.tv_sec) * 1000
-        + (usage.ru_utime.tv_usec + usage.ru_stime.tv_usec) / 1000;
+           + (usage.ru_utime.tv_usec + usage.ru_stime.tv_usec) / 1000;
 }
 
 // Processor time of the calling thread so far, in ms: the part of a build
@@ -365,7 +380,8 @@ int main(int argc, char **argv)
         else if (args.at(i) == QLatin1String("--cycle"))
             cycle = true;
         else {
-            std::fprintf(stderr, "usage: corvid-bench [--scale F] [--steps N] [--usage F] [--keep DIR] [--cycle]\n");
+            std::fprintf(stderr,
+                         "usage: corvid-bench [--scale F] [--steps N] [--usage F] [--keep DIR] [--cycle]\n");
             return 1;
         }
     }
@@ -378,8 +394,8 @@ int main(int argc, char **argv)
         return 1;
     }
     std::printf("%-5s %10s %12s %7s %7s %9s %9s %8s %9s %11s %8s %10s %9s\n", "step", "cmd lines",
-                "usage items", "cores", "help", "input MB", "build ms", "cpu ms", "main cpu",
-                "xmllint ms", "peak MB", "dialog ms", "stall ms");
+                "usage items", "cores", "help", "input MB", "build ms", "cpu ms", "main cpu", "xmllint ms",
+                "peak MB", "dialog ms", "stall ms");
     long buildsPeakKiB = 0, runPeakKiB = 0;
     for (int step = 1; step <= steps; ++step) {
         const Sizes sizes = sizesFor(scale * step / steps, usageScale);
@@ -427,8 +443,7 @@ int main(int argc, char **argv)
         std::printf("%-5d %10d %12d %7d %7d %9.1f %9lld %8lld %9lld %11s %8.1f %10lld %9s\n", step,
                     sizes.commandLines, sizes.usageItems, sizes.coreInstances, sizes.helpEntries,
                     bytes / 1048576.0, static_cast<long long>(ms), static_cast<long long>(cpu),
-                    static_cast<long long>(mainCpu),
-                    floorMs < 0 ? "-" : qPrintable(QString::number(floorMs)),
+                    static_cast<long long>(mainCpu), floorMs < 0 ? "-" : qPrintable(QString::number(floorMs)),
                     buildPeak / 1024.0, static_cast<long long>(dialogMs),
                     stallMs < 0 ? "-" : qPrintable(QString::number(stallMs)));
         buildsPeakKiB = std::max(buildsPeakKiB, buildPeak);
@@ -438,10 +453,12 @@ int main(int argc, char **argv)
     }
     if (xmllint.isEmpty())
         std::printf("xmllint not found: no parsing floor (Debian package libxml2-utils)\n");
-    std::printf("peak resident memory of the builds: %.1f MB (with the dialogs: %.1f MB); "
-                "page of the last step: %.1f MB\n",
-                buildsPeakKiB / 1024.0, std::max(runPeakKiB, peakRssKiB()) / 1024.0,
-                fileSize(root + QLatin1String("/step") + QString::number(steps)
-                         + QLatin1String("/device_usage_statistics.html")) / 1048576.0);
+    std::printf(
+        "peak resident memory of the builds: %.1f MB (with the dialogs: %.1f MB); "
+        "page of the last step: %.1f MB\n",
+        buildsPeakKiB / 1024.0, std::max(runPeakKiB, peakRssKiB()) / 1024.0,
+        fileSize(root + QLatin1String("/step") + QString::number(steps)
+                 + QLatin1String("/device_usage_statistics.html"))
+            / 1048576.0);
     return 0;
 }

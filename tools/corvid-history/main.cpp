@@ -116,14 +116,16 @@ int list(bool json)
         return 0;
     }
     if (entries.isEmpty())
-        std::fprintf(stderr, "corvid-history: no report has been sent (%s)\n", qUtf8Printable(history->fileName()));
+        std::fprintf(stderr, "corvid-history: no report has been sent (%s)\n",
+                     qUtf8Printable(history->fileName()));
     for (const CrvC_SendHistory::Entry &entry : entries) {
         const QString host = QUrl(entry.destination).host();
         std::printf("%5lld  %s  %-6s  %-24s %9s  %s\n", static_cast<long long>(entry.id),
                     qUtf8Printable(entry.time.toLocalTime().toString(QStringLiteral("yyyy-MM-dd HH:mm:ss"))),
                     qUtf8Printable(CrvC_SendHistory::methodName(entry.method)),
                     qUtf8Printable(host.isEmpty() ? entry.destination : host),
-                    qUtf8Printable(QStringLiteral("%1 bytes").arg(entry.bytes)), qUtf8Printable(entry.outcome()));
+                    qUtf8Printable(QStringLiteral("%1 bytes").arg(entry.bytes)),
+                    qUtf8Printable(entry.outcome()));
     }
     return 0;
 }

@@ -57,7 +57,8 @@ int printPage(const QString &path)
     if (!file.open(QIODevice::ReadOnly))
         return fail(QStringLiteral("cannot read %1").arg(path));
     if (file.size() > CrvB_PageReader::MaxPageBytes)
-        return fail(QStringLiteral("rejected %1: larger than %2 bytes").arg(path, QString::number(CrvB_PageReader::MaxPageBytes)));
+        return fail(QStringLiteral("rejected %1: larger than %2 bytes")
+                        .arg(path, QString::number(CrvB_PageReader::MaxPageBytes)));
     const CrvB_PageReader::Result result = CrvB_PageReader::read(file.readAll());
     if (!result.ok())
         return fail(QStringLiteral("rejected %1: %2").arg(path, result.rejection));
@@ -83,8 +84,8 @@ int main(int argc, char **argv)
             return 0;
         }
         const bool takesValue = arg == QLatin1String("--db") || arg == QLatin1String("--rejected")
-            || arg == QLatin1String("--shard") || arg == QLatin1String("--print")
-            || arg == QLatin1String("--commit-every");
+                                || arg == QLatin1String("--shard") || arg == QLatin1String("--print")
+                                || arg == QLatin1String("--commit-every");
         if (takesValue && i + 1 >= args.size())
             return fail(QStringLiteral("%1 needs a value (see --help)").arg(arg));
         if (arg == QLatin1String("--db")) {
@@ -115,7 +116,8 @@ int main(int argc, char **argv)
         }
     }
     if (!print.isEmpty())
-        return paths.isEmpty() ? printPage(print) : fail(QStringLiteral("--print takes one page and no PATH"));
+        return paths.isEmpty() ? printPage(print)
+                               : fail(QStringLiteral("--print takes one page and no PATH"));
     if (paths.isEmpty())
         return fail(QStringLiteral("no page or folder given (see --help)"));
 

@@ -5,8 +5,7 @@
 #include <algorithm>
 
 ConnectionPool::ConnectionPool(std::size_t workers, Clock::duration grace, double slowBytesPerSecond)
-    : m_grace(grace)
-    , m_slowRate(slowBytesPerSecond)
+    : m_grace(grace), m_slowRate(slowBytesPerSecond)
 {
     for (std::size_t i = 0; i < std::max<std::size_t>(1, workers); ++i)
         m_workers.emplace_back([this] { work(); });
@@ -134,8 +133,7 @@ void ConnectionPool::cutSlowestLocked(Clock::time_point now)
         if (rate < m_slowRate)
             slow.emplace_back(rate, connection);
     }
-    std::sort(slow.begin(), slow.end(),
-              [](const auto &a, const auto &b) { return a.first < b.first; });
+    std::sort(slow.begin(), slow.end(), [](const auto &a, const auto &b) { return a.first < b.first; });
     const std::size_t wanted = m_jobs.size() - freeing;
     for (std::size_t i = 0; i < slow.size() && i < wanted; ++i)
         cutLocked(*slow[i].second);

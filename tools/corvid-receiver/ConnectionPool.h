@@ -33,9 +33,9 @@ public:
     struct Connection
     {
         int socket = -1;
-        Clock::time_point start;          // when its worker took it
-        Clock::time_point deadline;       // cut when this passes
-        bool finishing = false;           // never cut
+        Clock::time_point start;    // when its worker took it
+        Clock::time_point deadline; // cut when this passes
+        bool finishing = false;     // never cut
         bool cut = false;
         std::atomic<std::uint64_t> bytes{0}; // bytes received so far
     };

@@ -35,9 +35,7 @@ bool isDigits(const std::string &text)
 
 ReceiverServer::ReceiverServer(const std::string &certFile, const std::string &keyFile, std::string bodyPath,
                                const Limits &limits)
-    : httplib::SSLServer(certFile.c_str(), keyFile.c_str())
-    , m_bodyPath(std::move(bodyPath))
-    , m_limits(limits)
+    : httplib::SSLServer(certFile.c_str(), keyFile.c_str()), m_bodyPath(std::move(bodyPath)), m_limits(limits)
 {
     new_task_queue = [this] {
         auto *pool = new ConnectionPool(m_limits.workers, std::chrono::seconds(1), SlowBytesPerSecond);
@@ -106,7 +104,8 @@ int ReceiverServer::screen(const httplib::Request &request, std::string &text) c
         return 411;
     }
     if (lengths == 1 && std::stoull(length) > m_limits.maxBodyBytes) {
-        text = "refused: the request body is larger than " + std::to_string(m_limits.maxBodyBytes) + " bytes\n";
+        text =
+            "refused: the request body is larger than " + std::to_string(m_limits.maxBodyBytes) + " bytes\n";
         return 413;
     }
     return 0;
@@ -157,8 +156,9 @@ bool ReceiverServer::serve(socket_t sock, ConnectionPool::Connection &connection
             request.ssl = ssl;
             const std::size_t budget = bodyBudget(request);
             stream.setBudget(budget);
-            pool.setDeadline(connection, Clock::now() + m_limits.timeout
-                                             + std::chrono::seconds(budget / std::size_t(SlowBytesPerSecond)));
+            pool.setDeadline(connection,
+                             Clock::now() + m_limits.timeout
+                                 + std::chrono::seconds(budget / std::size_t(SlowBytesPerSecond)));
         });
         t_current = CurrentRequest();
 

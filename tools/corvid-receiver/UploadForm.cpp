@@ -22,8 +22,7 @@ bool closeSynced(std::FILE *file)
 } // namespace
 
 UploadForm::UploadForm(UploadStore &store, std::string accessCode)
-    : m_store(store)
-    , m_accessCode(std::move(accessCode))
+    : m_store(store), m_accessCode(std::move(accessCode))
 {
 }
 
@@ -116,12 +115,11 @@ bool UploadForm::finish(bool complete)
 unsigned UploadForm::store(const std::string &remoteAddress)
 {
     using ReceiverText::escaped;
-    const std::string fields = "received=" + ReceiverText::utcNow() + "\nremote=" + escaped(remoteAddress)
-                               + "\nfile_loc=" + escaped(m_fileName) + "\nsize=" + std::to_string(m_fileBytes)
-                               + "\ndomain=" + escaped(m_fields["domain"])
-                               + "\nregid=" + escaped(m_fields["regid"])
-                               + "\naccess=" + escaped(m_fields[accessField])
-                               + "\nstored_as=" + m_storedAs + "\n";
+    const std::string fields =
+        "received=" + ReceiverText::utcNow() + "\nremote=" + escaped(remoteAddress)
+        + "\nfile_loc=" + escaped(m_fileName) + "\nsize=" + std::to_string(m_fileBytes)
+        + "\ndomain=" + escaped(m_fields["domain"]) + "\nregid=" + escaped(m_fields["regid"])
+        + "\naccess=" + escaped(m_fields[accessField]) + "\nstored_as=" + m_storedAs + "\n";
     std::FILE *file = std::fopen((m_incoming + "/" + UploadStore::MetadataName).c_str(), "wbx");
     const bool written = file && std::fwrite(fields.data(), 1, fields.size(), file) == fields.size();
     if (!file || !closeSynced(file) || !written) {

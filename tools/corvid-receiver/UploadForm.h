@@ -46,8 +46,8 @@ private:
     UploadStore &m_store;
     const std::string m_accessCode;
     std::map<std::string, std::string> m_fields; // domain, regid, access: first of each
-    std::string m_part;                            // name of the part being read
-    std::string *m_textTarget = nullptr;           // where its text goes, if anywhere
+    std::string m_part;                          // name of the part being read
+    std::string *m_textTarget = nullptr;         // where its text goes, if anywhere
     std::string m_incoming;
     std::string m_fileName; // as the client named it, for the fields
     std::string m_storedAs;

@@ -2,8 +2,8 @@
 
 #include <dirent.h>
 #include <fcntl.h>
-#include <sys/stat.h>
 #include <stdio.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -59,8 +59,7 @@ bool moveWithoutReplacing(const std::string &from, const std::string &to)
 
 } // namespace
 
-UploadStore::UploadStore(std::string dir)
-    : m_dir(std::move(dir))
+UploadStore::UploadStore(std::string dir) : m_dir(std::move(dir))
 {
 }
 

@@ -235,9 +235,8 @@ int main(int argc, char **argv)
                                     : (server.bind_to_port(address, int(port)) ? int(port) : -1);
     if (boundPort <= 0)
         return fail("cannot listen on " + address + " port " + std::to_string(port));
-    const std::string authority =
-        (address.find(':') != std::string::npos ? "[" + address + "]" : address) + ":"
-        + std::to_string(boundPort);
+    const std::string authority = (address.find(':') != std::string::npos ? "[" + address + "]" : address)
+                                  + ":" + std::to_string(boundPort);
 
     UploadStore store(dataDir);
     const IngestTarget ingest{ingestUrl, dataDir};

@@ -80,10 +80,10 @@ void recordSends(const QByteArray &page, const QString &projectFile)
         const char *destination;
         const char *detail;
     } sends[] = {
-        {CrvC_SendHistory::Method::Email, 4000, CrvC_SendHistory::State::Handed, "usage-statistics@vantor.example",
-         "/usr/bin/thunderbird"},
-        {CrvC_SendHistory::Method::Upload, 1500, CrvC_SendHistory::State::Failed, "https://www.vantor.example",
-         "Could not connect to www.vantor.example."},
+        {CrvC_SendHistory::Method::Email, 4000, CrvC_SendHistory::State::Handed,
+         "usage-statistics@vantor.example", "/usr/bin/thunderbird"},
+        {CrvC_SendHistory::Method::Upload, 1500, CrvC_SendHistory::State::Failed,
+         "https://www.vantor.example", "Could not connect to www.vantor.example."},
         {CrvC_SendHistory::Method::Upload, 2, CrvC_SendHistory::State::Sent,
          "https://upload.vantor.example/cgi-bin/corvid/upload", "Thank you: report 1187 received."},
     };
@@ -101,7 +101,9 @@ void recordSends(const QByteArray &page, const QString &projectFile)
         qint64 attempt = 0;
         history.addEntry(entry, page, &attempt);
         history.finishAttempt(attempt, send.state, QLatin1String(send.detail),
-                              send.state == CrvC_SendHistory::State::Handed ? -1 : send.state == CrvC_SendHistory::State::Sent ? 0 : 4);
+                              send.state == CrvC_SendHistory::State::Handed ? -1
+                              : send.state == CrvC_SendHistory::State::Sent ? 0
+                                                                            : 4);
     }
 }
 

@@ -236,7 +236,8 @@ int main(int argc, char **argv)
             continue;
         const long long size = readableFileSize(field.value);
         if (size < 0)
-            return fail(UploadFileError, "cannot read the file \"" + field.value + "\" of field " + field.name);
+            return fail(UploadFileError,
+                        "cannot read the file \"" + field.value + "\" of field " + field.name);
         uploadBytes += size;
     }
     const long long limitSeconds = BaseSeconds + uploadBytes / BytesPerSecond;
@@ -312,10 +313,10 @@ int main(int argc, char **argv)
                                        + ", a redirection, which is not followed"
                                        + (redirectTarget.empty() ? "" : " (to " + redirectTarget + ")"));
     if (transfer.timedOut)
-        return fail(TimeLimitError, "the transfer took longer than its limit of " + std::to_string(limitSeconds)
-                                        + " s (" + url + ")");
+        return fail(TimeLimitError, "the transfer took longer than its limit of "
+                                        + std::to_string(limitSeconds) + " s (" + url + ")");
     if (code != CURLE_OK)
-        return fail(classify(code), std::string(errorText[0] ? errorText : curl_easy_strerror(code))
-                                        + " (" + url + ")");
+        return fail(classify(code),
+                    std::string(errorText[0] ? errorText : curl_easy_strerror(code)) + " (" + url + ")");
     return Success;
 }

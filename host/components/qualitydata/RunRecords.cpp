@@ -29,8 +29,8 @@ QString escaped(const QString &text)
 
 void appendCell(QString &row, const char *tag, const QString &value)
 {
-    row += QLatin1String("<TD><") + QLatin1String(tag) + QLatin1Char('>') + value
-           + QLatin1String("</") + QLatin1String(tag) + QLatin1String("></TD>");
+    row += QLatin1String("<TD><") + QLatin1String(tag) + QLatin1Char('>') + value + QLatin1String("</")
+           + QLatin1String(tag) + QLatin1String("></TD>");
 }
 
 } // namespace

@@ -12,8 +12,7 @@ CitI::IInterface *CRunStatisticsReader::GetInterface(const Port::XUID &iid)
     return RefObject::GetInterface(iid);
 }
 
-void CRunStatisticsReader::readRunStatistics(const Port::StringBase &projectFile,
-                                             Port::StringBase &html)
+void CRunStatisticsReader::readRunStatistics(const Port::StringBase &projectFile, Port::StringBase &html)
 {
     html = "";
     if (projectFile.IsEmpty())

@@ -8,12 +8,9 @@ using Gui::Clip::String;
 
 namespace Prjrep {
 
-RegSection::RegSection(std::shared_ptr<RepositoryStore> store, qint64 id,
-                       const Port::StringBase &name, int mode)
-    : m_store(std::move(store))
-    , m_id(id)
-    , m_name(name)
-    , m_mode(mode)
+RegSection::RegSection(std::shared_ptr<RepositoryStore> store, qint64 id, const Port::StringBase &name,
+                       int mode)
+    : m_store(std::move(store)), m_id(id), m_name(name), m_mode(mode)
 {
 }
 

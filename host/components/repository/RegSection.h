@@ -14,8 +14,7 @@ namespace Prjrep {
 class RegSection : public IRegSection
 {
 public:
-    RegSection(std::shared_ptr<RepositoryStore> store, qint64 id, const Port::StringBase &name,
-               int mode);
+    RegSection(std::shared_ptr<RepositoryStore> store, qint64 id, const Port::StringBase &name, int mode);
     ~RegSection() override;
 
     CitI::IInterface *GetInterface(const Port::XUID &iid) override;

@@ -23,8 +23,7 @@ CitI::IInterface *RepositoryObject::GetInterface(const Port::XUID &iid)
     return RefObject::GetInterface(iid);
 }
 
-int RepositoryObject::openSection(const Port::StringBase &projectFile,
-                                  const Port::StringBase &name, int mode,
+int RepositoryObject::openSection(const Port::StringBase &projectFile, const Port::StringBase &name, int mode,
                                   CitI::IInterface **section)
 {
     if (!section)
@@ -40,8 +39,7 @@ int RepositoryObject::openSection(const Port::StringBase &projectFile,
     if (!project.isFile())
         return StatusNotFound;
 
-    const QString fileName =
-        RepositoryStore::fileNameFor(QDir::cleanPath(project.absoluteFilePath()));
+    const QString fileName = RepositoryStore::fileNameFor(QDir::cleanPath(project.absoluteFilePath()));
     std::shared_ptr<RepositoryStore> &store = m_stores[{fileName, writable}];
     if (!store)
         store = RepositoryStore::open(fileName, writable, mode & ModeCreate, &status);

@@ -65,8 +65,8 @@ QString RepositoryStore::fileNameFor(const QString &projectFile)
     return name + QLatin1String(".orbrepo");
 }
 
-std::shared_ptr<RepositoryStore> RepositoryStore::open(const QString &fileName, bool writable,
-                                                       bool create, int *status)
+std::shared_ptr<RepositoryStore> RepositoryStore::open(const QString &fileName, bool writable, bool create,
+                                                       int *status)
 {
     *status = StatusFailed;
     if (!QFileInfo::exists(fileName) && !(writable && create)) {
@@ -98,8 +98,7 @@ std::shared_ptr<RepositoryStore> RepositoryStore::open(const QString &fileName, 
 }
 
 RepositoryStore::RepositoryStore(const QString &connectionName, bool writable)
-    : m_connectionName(connectionName)
-    , m_writable(writable)
+    : m_connectionName(connectionName), m_writable(writable)
 {
 }
 
@@ -156,14 +155,13 @@ int RepositoryStore::createSchema()
     if (existing != StatusNotFound)
         return existing;
     return run(true, [](QSqlQuery &query) {
-        const bool ok =
-            query.exec(QStringLiteral("CREATE TABLE IF NOT EXISTS sections("
-                                      "id INTEGER PRIMARY KEY, parent INTEGER NOT NULL, "
-                                      "name TEXT NOT NULL, UNIQUE(parent, name))"))
-            && query.exec(QStringLiteral("CREATE TABLE IF NOT EXISTS entries("
-                                         "section INTEGER NOT NULL, key TEXT NOT NULL, "
-                                         "value TEXT NOT NULL, PRIMARY KEY(section, key))"))
-            && query.exec(QStringLiteral("PRAGMA user_version = 1"));
+        const bool ok = query.exec(QStringLiteral("CREATE TABLE IF NOT EXISTS sections("
+                                                  "id INTEGER PRIMARY KEY, parent INTEGER NOT NULL, "
+                                                  "name TEXT NOT NULL, UNIQUE(parent, name))"))
+                        && query.exec(QStringLiteral("CREATE TABLE IF NOT EXISTS entries("
+                                                     "section INTEGER NOT NULL, key TEXT NOT NULL, "
+                                                     "value TEXT NOT NULL, PRIMARY KEY(section, key))"))
+                        && query.exec(QStringLiteral("PRAGMA user_version = 1"));
         return ok ? int(StatusOk) : int(StatusFailed);
     });
 }
@@ -172,9 +170,9 @@ int RepositoryStore::findSection(qint64 parent, const QString &name, bool create
 {
     auto select = [&](QSqlQuery &query) {
         QVariant found;
-        const int status = selectOne(
-            query, QStringLiteral("SELECT id FROM sections WHERE parent = ? AND name = ?"),
-            {parent, name}, &found);
+        const int status =
+            selectOne(query, QStringLiteral("SELECT id FROM sections WHERE parent = ? AND name = ?"),
+                      {parent, name}, &found);
         if (status == StatusOk)
             *id = found.toLongLong();
         return status;
@@ -197,26 +195,26 @@ int RepositoryStore::value(qint64 section, const QString &key, QString *value)
 {
     return run(false, [&](QSqlQuery &query) {
         QVariant found;
-        const int status = selectOne(
-            query, QStringLiteral("SELECT value FROM entries WHERE section = ? AND key = ?"),
-            {section, key}, &found);
+        const int status =
+            selectOne(query, QStringLiteral("SELECT value FROM entries WHERE section = ? AND key = ?"),
+                      {section, key}, &found);
         if (status == StatusOk)
             *value = found.toString();
         return status;
     });
 }
 
-int RepositoryStore::setValue(qint64 section, const QString &key, const QString &value,
-                              Condition condition, const QString &expected)
+int RepositoryStore::setValue(qint64 section, const QString &key, const QString &value, Condition condition,
+                              const QString &expected)
 {
     if (!m_writable)
         return StatusDenied;
     return run(true, [&](QSqlQuery &query) {
         if (condition != Replace) {
             QVariant stored;
-            const int status = selectOne(
-                query, QStringLiteral("SELECT value FROM entries WHERE section = ? AND key = ?"),
-                {section, key}, &stored);
+            const int status =
+                selectOne(query, QStringLiteral("SELECT value FROM entries WHERE section = ? AND key = ?"),
+                          {section, key}, &stored);
             if (status == StatusFailed)
                 return int(StatusFailed);
             const bool holds = condition == IfAbsent ? status == StatusNotFound

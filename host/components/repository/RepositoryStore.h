@@ -27,8 +27,8 @@ public:
 
     // Opens `fileName`. Without `writable` the file is opened read-only and
     // must exist; with `create` a missing file is created.
-    static std::shared_ptr<RepositoryStore> open(const QString &fileName, bool writable,
-                                                 bool create, int *status);
+    static std::shared_ptr<RepositoryStore> open(const QString &fileName, bool writable, bool create,
+                                                 int *status);
     ~RepositoryStore();
     RepositoryStore(const RepositoryStore &) = delete;
     RepositoryStore &operator=(const RepositoryStore &) = delete;
@@ -47,8 +47,8 @@ public:
     };
     // Stores `value` under `key` when `condition` holds (else
     // StatusConflict), in one transaction.
-    int setValue(qint64 section, const QString &key, const QString &value,
-                 Condition condition = Replace, const QString &expected = QString());
+    int setValue(qint64 section, const QString &key, const QString &value, Condition condition = Replace,
+                 const QString &expected = QString());
 
 private:
     RepositoryStore(const QString &connectionName, bool writable);
