@@ -243,7 +243,8 @@ bool CrvB_Store::open(const QString &url, bool readOnly, QString *error)
         db.setConnectOptions(m_url.options);
     }
     if (!db.open()) {
-        *error = QStringLiteral("cannot open the database %1: %2").arg(url, errorText(db.lastError()));
+        *error = QStringLiteral("cannot open the database %1: %2")
+                     .arg(CrvB_DatabaseUrl::redacted(url), errorText(db.lastError()));
         return false;
     }
     if (readOnly)
