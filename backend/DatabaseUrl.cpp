@@ -99,7 +99,8 @@ bool CrvB_DatabaseUrl::parse(const QString &url, QString *error)
             database = value;
         else if (name == QLatin1String("sslmode") || name == QLatin1String("connect_timeout")
                  || name == QLatin1String("application_name")) {
-            if (value.contains(QLatin1Char(';')) || value.contains(QLatin1Char(' ')) || value.contains(QLatin1Char('\'')))
+            if (value.contains(QLatin1Char(';')) || value.contains(QLatin1Char(' '))
+                || value.contains(QLatin1Char('\'')))
                 return fail(QStringLiteral("the value of %1 holds a blank, quote or semicolon").arg(name));
             extra.append(name + QLatin1Char('=') + value);
         } else if (name != QLatin1String("port"))

@@ -24,9 +24,9 @@ public:
 
     Engine engine = Engine::None;
     QString database; // the SQLite file, or the PostgreSQL database name
-    QString host;     // host name, address or socket folder; empty for the default
-    int port = -1;    // -1 for the default
+    QString host; // host name, address or socket folder; empty for the default
+    int port = -1; // -1 for the default
     QString user;
     QString password;
-    QString options;  // further PostgreSQL connection parameters, "name=value;..."
+    QString options; // further PostgreSQL connection parameters, "name=value;..."
 };

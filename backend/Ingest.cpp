@@ -111,12 +111,14 @@ void CrvB_Ingest::ingestFolder(const QString &folder, int depth)
         return;
     }
     if (depth >= MaxFolderDepth) {
-        m_say(QStringLiteral("skipped %1: deeper than %2 folders").arg(folder, QString::number(MaxFolderDepth)));
+        m_say(QStringLiteral("skipped %1: deeper than %2 folders")
+                  .arg(folder, QString::number(MaxFolderDepth)));
         return;
     }
-    const QString rejected = m_rejectedFolder.isEmpty() ? QString() : QFileInfo(m_rejectedFolder).canonicalFilePath();
-    const QFileInfoList entries =
-        QDir(folder).entryInfoList(QDir::Dirs | QDir::Files | QDir::NoDotAndDotDot | QDir::NoSymLinks, QDir::Name);
+    const QString rejected =
+        m_rejectedFolder.isEmpty() ? QString() : QFileInfo(m_rejectedFolder).canonicalFilePath();
+    const QFileInfoList entries = QDir(folder).entryInfoList(
+        QDir::Dirs | QDir::Files | QDir::NoDotAndDotDot | QDir::NoSymLinks, QDir::Name);
     for (const QFileInfo &entry : entries) {
         if (entry.isDir()) {
             if (!rejected.isEmpty() && entry.canonicalFilePath() == rejected)
@@ -124,7 +126,8 @@ void CrvB_Ingest::ingestFolder(const QString &folder, int depth)
             ingestFolder(entry.filePath(), depth + 1);
         } else if (entry.suffix().compare(QLatin1String("html"), Qt::CaseInsensitive) == 0
                    && inShard(entry.fileName())) {
-            ingestPage(entry.filePath(), CrvB_Store::Arrival{entry.filePath(), QString(), QString(), QString()});
+            ingestPage(entry.filePath(),
+                       CrvB_Store::Arrival{entry.filePath(), QString(), QString(), QString()});
         }
     }
 }
@@ -138,13 +141,15 @@ void CrvB_Ingest::ingestPage(const QString &pagePath, const CrvB_Store::Arrival 
     }
     if (file.size() > CrvB_PageReader::MaxPageBytes) {
         // Not read into memory; the digest is left out of the copy's name.
-        reject(pagePath, QByteArray(), QStringLiteral("larger than %1 bytes").arg(CrvB_PageReader::MaxPageBytes));
+        reject(pagePath, QByteArray(),
+               QStringLiteral("larger than %1 bytes").arg(CrvB_PageReader::MaxPageBytes));
         return;
     }
     // Read no more than the limit even should the file grow meanwhile.
     const QByteArray page = file.read(qMin(file.size(), CrvB_PageReader::MaxPageBytes) + 1);
     if (page.size() > CrvB_PageReader::MaxPageBytes) {
-        reject(pagePath, QByteArray(), QStringLiteral("larger than %1 bytes").arg(CrvB_PageReader::MaxPageBytes));
+        reject(pagePath, QByteArray(),
+               QStringLiteral("larger than %1 bytes").arg(CrvB_PageReader::MaxPageBytes));
         return;
     }
     file.close();
@@ -209,7 +214,8 @@ void CrvB_Ingest::reject(const QString &pagePath, const QByteArray &sha256, cons
     if (m_rejectedFolder.isEmpty() || !QDir().mkpath(m_rejectedFolder))
         return;
     // Named by digest, so that a page rejected again replaces its own copy.
-    const QString name = (sha256.isEmpty() ? QString() : QString::fromLatin1(sha256.left(16)) + QLatin1Char('-'))
+    const QString name =
+        (sha256.isEmpty() ? QString() : QString::fromLatin1(sha256.left(16)) + QLatin1Char('-'))
         + QFileInfo(pagePath).fileName();
     const QString copy = m_rejectedFolder + QLatin1Char('/') + name;
     if (QFileInfo(copy).canonicalFilePath() == QFileInfo(pagePath).canonicalFilePath())
@@ -238,6 +244,7 @@ std::string CrvB_Ingest::receiverIngest(const std::string &url, const std::strin
     } else {
         lines.append(QStringLiteral("failed: ") + error);
     }
-    const QString line = QStringLiteral("ingest ") + name + QLatin1String(": ") + lines.join(QLatin1String("; "));
+    const QString line =
+        QStringLiteral("ingest ") + name + QLatin1String(": ") + lines.join(QLatin1String("; "));
     return line.toStdString();
 }

@@ -68,8 +68,8 @@ private:
     void ingestFolder(const QString &folder, int depth);
     bool inShard(const QString &name) const;
     void reject(const QString &pagePath, const QByteArray &sha256, const QString &reason);
-    void store(const QString &pagePath, const QByteArray &sha256, qint64 bytes, const CrvB_ReportRecord &record,
-               const CrvB_Store::Arrival &arrival);
+    void store(const QString &pagePath, const QByteArray &sha256, qint64 bytes,
+               const CrvB_ReportRecord &record, const CrvB_Store::Arrival &arrival);
 
     CrvB_Store &m_store;
     std::function<void(const QString &)> m_say;

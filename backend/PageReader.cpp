@@ -54,7 +54,8 @@ int decodeReference(const char *text, qsizetype size, qsizetype at, QByteArray &
     {
         const char *name;
         const char *utf8;
-    } named[] = {{"lt;", "<"}, {"gt;", ">"}, {"amp;", "&"}, {"quot;", "\""}, {"apos;", "'"}, {"nbsp;", "\xC2\xA0"}};
+    } named[] = {{"lt;", "<"},    {"gt;", ">"},   {"amp;", "&"},
+                 {"quot;", "\""}, {"apos;", "'"}, {"nbsp;", "\xC2\xA0"}};
     const qsizetype rest = size - at - 1;
     const char *p = text + at + 1;
     for (const auto &entity : named) {
@@ -255,8 +256,8 @@ private:
                 valueEnd = pos;
             }
             if (attribute == "name" && !element.hasName) {
-                element.name =
-                    CrvB_PageReader::decodeEntities(QByteArray::fromRawData(m_data + valueStart, valueEnd - valueStart));
+                element.name = CrvB_PageReader::decodeEntities(
+                    QByteArray::fromRawData(m_data + valueStart, valueEnd - valueStart));
                 element.hasName = true;
             }
         }
@@ -385,8 +386,8 @@ QByteArray CrvB_PageReader::toJson(const QVector<Value> &values)
         for (const QString &element : v.path)
             path.append(string(element));
         out += (i ? ",\n  " : "\n  ") + QByteArray("{\"tag\": ") + string(v.tag)
-            + ", \"name\": " + (v.hasName ? string(v.name) : QByteArray("null")) + ", \"value\": " + string(v.value)
-            + ", \"path\": [" + path.join(", ") + "]}";
+            + ", \"name\": " + (v.hasName ? string(v.name) : QByteArray("null"))
+            + ", \"value\": " + string(v.value) + ", \"path\": [" + path.join(", ") + "]}";
     }
     return out + "\n]}\n";
 }

@@ -25,18 +25,18 @@ public:
     struct Limits
     {
         qint64 maxBytes = MaxPageBytes;
-        int maxDepth = 16;       // dtag elements within each other
+        int maxDepth = 16; // dtag elements within each other
         int maxValues = 2000000;
     };
 
     struct Value
     {
-        QString tag;       // element name in lower case, e.g. "dtag-property"
-        QString name;      // its name attribute (hasName false when it has none)
+        QString tag; // element name in lower case, e.g. "dtag-property"
+        QString name; // its name attribute (hasName false when it has none)
         bool hasName = false;
-        QString value;     // the text between its tags, other mark-up removed, entities decoded
-        QStringList path;  // the enclosing dtag elements, outermost first: "tag" or "tag:name"
-        int parent = -1;   // which enclosing element: its number in opening order; -1 for none
+        QString value; // the text between its tags, other mark-up removed, entities decoded
+        QStringList path; // the enclosing dtag elements, outermost first: "tag" or "tag:name"
+        int parent = -1; // which enclosing element: its number in opening order; -1 for none
     };
 
     struct Result

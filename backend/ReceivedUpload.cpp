@@ -40,7 +40,8 @@ bool CrvB_ReceivedUpload::read(const QString &folder, QString *error)
         if (equals <= 0)
             continue;
         const QByteArray name = line.left(equals).trimmed();
-        const QString value = QString::fromUtf8(QByteArray::fromPercentEncoding(line.mid(equals + 1).trimmed()));
+        const QString value =
+            QString::fromUtf8(QByteArray::fromPercentEncoding(line.mid(equals + 1).trimmed()));
         if (name == "received")
             arrival.receivedAt = value;
         else if (name == "domain")

@@ -10,7 +10,18 @@ using Value = CrvB_PageReader::Value;
 // What each element of the page is to the store. Elements of the pairs come
 // one after the other: the first's value is always followed at once by the
 // second's.
-enum class Kind { Other, PairFirst, PairSecond, Property, GroupName, Item, CommandLine, CoreType, RunTool, RunField };
+enum class Kind {
+    Other,
+    PairFirst,
+    PairSecond,
+    Property,
+    GroupName,
+    Item,
+    CommandLine,
+    CoreType,
+    RunTool,
+    RunField
+};
 
 struct Role
 {
@@ -28,9 +39,9 @@ const char *const pairNames[][2] = {
 enum Pair { CoreParameter, DesignProperty, ProcessProperty, SourceType, HelpEntry };
 
 // The run statistics fields after "dtag-run-tool", in the order of CrvB_ReportRecord::Run.
-const char *const runFieldNames[] = {"dtag-run-count",         "dtag-run-completed",      "dtag-run-failed",
-                                     "dtag-run-cancelled",     "dtag-run-total-seconds", "dtag-run-average-seconds",
-                                     "dtag-run-last-date"};
+const char *const runFieldNames[] = {
+    "dtag-run-count",         "dtag-run-completed",       "dtag-run-failed",   "dtag-run-cancelled",
+    "dtag-run-total-seconds", "dtag-run-average-seconds", "dtag-run-last-date"};
 
 Role roleOf(const QString &tag)
 {
@@ -69,7 +80,9 @@ QStringList optionsOf(const QString &line)
 {
     QStringList options;
     for (const QStringView word : QStringView(line).split(QLatin1Char(' '), Qt::SkipEmptyParts)) {
-        const qsizetype dashes = word.startsWith(QLatin1String("--")) ? 2 : word.startsWith(QLatin1Char('-')) ? 1 : 0;
+        const qsizetype dashes = word.startsWith(QLatin1String("--")) ? 2
+            : word.startsWith(QLatin1Char('-'))                       ? 1
+                                                                      : 0;
         if (dashes && word.size() > dashes && word.at(dashes).isLetter() && word.at(dashes).unicode() < 128
             && !options.contains(word))
             options.append(word.toString());
@@ -80,7 +93,7 @@ QStringList optionsOf(const QString &line)
 class Sorter
 {
 public:
-    Sorter(CrvB_ReportRecord &record) : r(record) {}
+    Sorter(CrvB_ReportRecord &record) : r(record) { }
 
     bool add(const Value &v, const Value *next, QString *reason)
     {
@@ -89,15 +102,17 @@ public:
         switch (role.kind) {
         case Kind::PairFirst:
             if (!next || next->tag != QLatin1String(pairNames[role.index][1]))
-                return fail(reason, QStringLiteral("<%1> is not followed by <%2>")
-                                        .arg(v.tag, QLatin1String(pairNames[role.index][1])));
+                return fail(reason,
+                            QStringLiteral("<%1> is not followed by <%2>")
+                                .arg(v.tag, QLatin1String(pairNames[role.index][1])));
             pairOf(Pair(role.index), v, text, next->value.trimmed());
             m_pairTaken = true;
             return true;
         case Kind::PairSecond:
             if (!m_pairTaken)
-                return fail(reason, QStringLiteral("<%1> does not follow <%2>")
-                                        .arg(v.tag, QLatin1String(pairNames[role.index][0])));
+                return fail(reason,
+                            QStringLiteral("<%1> does not follow <%2>")
+                                .arg(v.tag, QLatin1String(pairNames[role.index][0])));
             m_pairTaken = false;
             return true;
         case Kind::Property:
@@ -119,8 +134,8 @@ public:
             item(m_groupOfElement.value(v.parent), role.index, text);
             return true;
         case Kind::CommandLine:
-            r.commandLines.append({text.section(QLatin1Char(' '), 0, 0, QString::SectionSkipEmpty), text,
-                                   optionsOf(text)});
+            r.commandLines.append(
+                {text.section(QLatin1Char(' '), 0, 0, QString::SectionSkipEmpty), text, optionsOf(text)});
             return true;
         case Kind::CoreType:
             r.cores.append(text);
@@ -149,8 +164,8 @@ private:
 
     void other(const Value &v, const QString &text)
     {
-        r.others.append({v.tag, v.hasName ? QVariant(v.name) : QVariant(),
-                         v.path.join(QLatin1Char('/')), text});
+        r.others.append(
+            {v.tag, v.hasName ? QVariant(v.name) : QVariant(), v.path.join(QLatin1Char('/')), text});
     }
 
     void pairOf(Pair pair, const Value &v, const QString &first, const QString &second)
@@ -179,7 +194,8 @@ private:
     void item(int group, int level, const QString &text)
     {
         const int split = int(text.indexOf(QLatin1Char('=')));
-        r.items.append({group, level, split < 0 ? text : text.left(split), split < 0 ? QString() : text.mid(split + 1)});
+        r.items.append(
+            {group, level, split < 0 ? text : text.left(split), split < 0 ? QString() : text.mid(split + 1)});
     }
 
     // A group's name: the help lists keep the key in the name attribute, the
@@ -206,8 +222,8 @@ private:
             return fail(reason, QStringLiteral("<%1> out of place").arg(v.tag));
         m_runFields |= 1u << field;
         CrvB_ReportRecord::Run &row = r.runs.last();
-        QVariant *const numbers[] = {&row.runs,         &row.completed,      &row.failed, &row.cancelled,
-                                     &row.totalSeconds, &row.averageSeconds};
+        QVariant *const numbers[] = {&row.runs,      &row.completed,    &row.failed,
+                                     &row.cancelled, &row.totalSeconds, &row.averageSeconds};
         if (field < 4)
             *numbers[field] = CrvB_ReportRecord::integer(text);
         else if (field < 6)
@@ -218,11 +234,11 @@ private:
     }
 
     CrvB_ReportRecord &r;
-    bool m_pairTaken = false;         // the value before was the first of a pair
-    QSet<QString> m_properties;       // property names seen
+    bool m_pairTaken = false; // the value before was the first of a pair
+    QSet<QString> m_properties; // property names seen
     QHash<int, int> m_groupOfElement; // dtag-group element -> index into groups
-    QHash<int, QString> m_helpList;   // help dtag-group element -> its list name
-    uint m_runFields = 0;             // fields of the current run row, one bit each
+    QHash<int, QString> m_helpList; // help dtag-group element -> its list name
+    uint m_runFields = 0; // fields of the current run row, one bit each
 };
 
 } // namespace

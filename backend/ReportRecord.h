@@ -43,7 +43,8 @@ public:
     struct Run
     {
         QString tool;
-        QVariant runs, completed, failed, cancelled, totalSeconds, averageSeconds; // null when absent or no number
+        QVariant runs, completed, failed, cancelled, totalSeconds,
+            averageSeconds; // null when absent or no number
         QString lastRun;
     };
     struct HelpEntry
@@ -71,7 +72,7 @@ public:
     {
         QString tag;
         QVariant name; // null when the element has no name attribute
-        QString path;  // the value's path joined with "/"
+        QString path; // the value's path joined with "/"
         QString value;
     };
 

@@ -23,33 +23,54 @@ struct Question
 const QVector<Question> &questions()
 {
     static const QVector<Question> list = {
-        {"families", "reports per target family",
+        {"families",
+         "reports per target family",
          "SELECT COALESCE(target_family, ''), COUNT(*) FROM report GROUP BY COALESCE(target_family, '')",
-         {"family", "reports"}, {Kind::Text, Kind::Integer}, 1},
-        {"devices", "reports and distinct projects per family, device, package and speed",
+         {"family", "reports"},
+         {Kind::Text, Kind::Integer},
+         1},
+        {"devices",
+         "reports and distinct projects per family, device, package and speed",
          "SELECT COALESCE(target_family, ''), COALESCE(target_device, ''), COALESCE(target_package, ''), "
          "COALESCE(target_speed, ''), COUNT(*), COUNT(DISTINCT project_id) FROM report GROUP BY 1, 2, 3, 4",
          {"family", "device", "package", "speed", "reports", "projects"},
-         {Kind::Text, Kind::Text, Kind::Text, Kind::Text, Kind::Integer, Kind::Integer}, 4},
-        {"tools", "runs, failed and cancelled runs, average seconds per run, per tool",
+         {Kind::Text, Kind::Text, Kind::Text, Kind::Text, Kind::Integer, Kind::Integer},
+         4},
+        {"tools",
+         "runs, failed and cancelled runs, average seconds per run, per tool",
          "SELECT tool, COALESCE(SUM(runs), 0), COALESCE(SUM(failed), 0), COALESCE(SUM(cancelled), 0), "
-         "CAST(SUM(total_seconds) AS DOUBLE PRECISION) / NULLIF(SUM(runs), 0) FROM run_statistic GROUP BY tool",
+         "CAST(SUM(total_seconds) AS DOUBLE PRECISION) / NULLIF(SUM(runs), 0) FROM run_statistic GROUP BY "
+         "tool",
          {"tool", "runs", "failed", "cancelled", "average_seconds"},
-         {Kind::Text, Kind::Integer, Kind::Integer, Kind::Integer, Kind::Decimal}, 1},
-        {"options", "command lines using each option, per tool",
+         {Kind::Text, Kind::Integer, Kind::Integer, Kind::Integer, Kind::Decimal},
+         1},
+        {"options",
+         "command lines using each option, per tool",
          "SELECT c.tool, o.option_name, COUNT(*) FROM command_option o JOIN command_line c "
          "ON c.report_id = o.report_id AND c.line_no = o.line_no GROUP BY c.tool, o.option_name",
-         {"tool", "option", "command_lines"}, {Kind::Text, Kind::Text, Kind::Integer}, 2},
-        {"help", "help searches per search term (with and without results)",
+         {"tool", "option", "command_lines"},
+         {Kind::Text, Kind::Text, Kind::Integer},
+         2},
+        {"help",
+         "help searches per search term (with and without results)",
          "SELECT term, COALESCE(SUM(hits), 0) FROM help_entry "
          "WHERE list IN ('SearchFoundList', 'SearchNotFoundList') GROUP BY term",
-         {"term", "count"}, {Kind::Text, Kind::Integer}, 1},
-        {"cores", "core instances per core type",
-         "SELECT core_type, COUNT(*) FROM core GROUP BY core_type", {"core_type", "instances"},
-         {Kind::Text, Kind::Integer}, 1},
-        {"products", "reports per product version and OS platform",
-         "SELECT COALESCE(product_version, ''), COALESCE(os_platform, ''), COUNT(*) FROM report GROUP BY 1, 2",
-         {"product_version", "os", "reports"}, {Kind::Text, Kind::Text, Kind::Integer}, 2},
+         {"term", "count"},
+         {Kind::Text, Kind::Integer},
+         1},
+        {"cores",
+         "core instances per core type",
+         "SELECT core_type, COUNT(*) FROM core GROUP BY core_type",
+         {"core_type", "instances"},
+         {Kind::Text, Kind::Integer},
+         1},
+        {"products",
+         "reports per product version and OS platform",
+         "SELECT COALESCE(product_version, ''), COALESCE(os_platform, ''), COUNT(*) FROM report GROUP BY 1, "
+         "2",
+         {"product_version", "os", "reports"},
+         {Kind::Text, Kind::Text, Kind::Integer},
+         2},
     };
     return list;
 }
@@ -96,7 +117,8 @@ bool CrvB_Statistics::run(const QSqlDatabase &db, const QString &query, Table &t
     const auto question = std::find_if(questions().cbegin(), questions().cend(),
                                        [&](const Question &q) { return query == QLatin1String(q.name); });
     if (question == questions().cend()) {
-        *error = QStringLiteral("unknown question \"%1\" (one of: %2)").arg(query, queries().join(QLatin1String(", ")));
+        *error = QStringLiteral("unknown question \"%1\" (one of: %2)")
+                     .arg(query, queries().join(QLatin1String(", ")));
         return false;
     }
     table = Table();

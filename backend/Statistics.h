@@ -20,7 +20,7 @@ public:
         QStringList columns;
         QVector<Kind> kinds;
         QVector<QVariantList> rows; // QString, qlonglong or double (null when unknown)
-        int chartColumn = -1;       // the count the bar chart shows
+        int chartColumn = -1; // the count the bar chart shows
     };
 
     // families, devices, tools, options, help, cores, products

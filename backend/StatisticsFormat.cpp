@@ -77,9 +77,10 @@ QByteArray CrvB_StatisticsFormat::text(const CrvB_Statistics::Table &table)
 QByteArray CrvB_StatisticsFormat::csv(const CrvB_Statistics::Table &table)
 {
     auto field = [](QString text) -> QString {
-        if (text.contains(QLatin1Char(',')) || text.contains(QLatin1Char('"')) || text.contains(QLatin1Char('\n'))
-            || text.contains(QLatin1Char('\r')) || text != text.trimmed())
-            text = QLatin1Char('"') + text.replace(QLatin1Char('"'), QLatin1String("\"\"")) + QLatin1Char('"');
+        if (text.contains(QLatin1Char(',')) || text.contains(QLatin1Char('"'))
+            || text.contains(QLatin1Char('\n')) || text.contains(QLatin1Char('\r')) || text != text.trimmed())
+            text =
+                QLatin1Char('"') + text.replace(QLatin1Char('"'), QLatin1String("\"\"")) + QLatin1Char('"');
         return text;
     };
     QString out = table.columns.join(QLatin1Char(',')) + QLatin1String("\r\n");
@@ -156,7 +157,8 @@ QByteArray CrvB_StatisticsFormat::html(const CrvB_Statistics::Table &table)
     for (const QVariantList &row : table.rows) {
         out += QLatin1String("<tr>");
         for (int i = 0; i < row.size(); ++i)
-            out += (table.kinds.at(i) == Kind::Text ? QLatin1String("<td>") : QLatin1String("<td class=\"n\">"))
+            out +=
+                (table.kinds.at(i) == Kind::Text ? QLatin1String("<td>") : QLatin1String("<td class=\"n\">"))
                 + cell(row.at(i), table.kinds.at(i)).toHtmlEscaped() + QLatin1String("</td>");
         out += QLatin1String("</tr>\n");
     }

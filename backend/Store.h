@@ -22,7 +22,7 @@ public:
     // What the receiver kept beside a page.
     struct Arrival
     {
-        QString source;     // where the page was read from
+        QString source; // where the page was read from
         QString receivedAt; // ISO 8601, UTC; empty when unknown
         QString domain;
         QString regid;

@@ -117,8 +117,10 @@ private Q_SLOTS:
         QVERIFY2(m_postgres.start(), qPrintable(m_postgres.error()));
         QVERIFY(m_env->writeDataFile("orb_version", "product=Orb Design Suite\nversion=14.7\n"));
         // Where corvid-report, without the test mode of QStandardPaths, looks.
-        const QString helpFile = qEnvironmentVariable("XDG_DATA_HOME") + "/Vantor/Common/14.7/orbhelpviewerdata.xml";
-        QVERIFY(writeFile(helpFile, readFile(Environment::sourceDir() + "/examples/helpviewer/orbhelpviewerdata.xml")));
+        const QString helpFile =
+            qEnvironmentVariable("XDG_DATA_HOME") + "/Vantor/Common/14.7/orbhelpviewerdata.xml";
+        QVERIFY(writeFile(helpFile,
+                          readFile(Environment::sourceDir() + "/examples/helpviewer/orbhelpviewerdata.xml")));
 
         // Three projects: the sample, the sample with odd values, and one
         // without any tool reports; one page each, the last in an upload folder.
@@ -138,8 +140,8 @@ private Q_SLOTS:
             QStringList arguments{"--family", families.at(i), "--out", pages.at(i)};
             if (i < 2)
                 arguments += {"--project", projects.at(i) + "/ledctrl.orb"};
-            const ToolRun report =
-                runStaged("corvid-report", arguments + QStringList{projects.at(i) + "/ledctrl_usage.xml"}, m_work);
+            const ToolRun report = runStaged(
+                "corvid-report", arguments + QStringList{projects.at(i) + "/ledctrl_usage.xml"}, m_work);
             QVERIFY2(report.exitCode == 0, qPrintable(report.output));
         }
         QVERIFY(writeFile(m_work + "/pages/000007/@fields.txt",
@@ -152,9 +154,12 @@ private Q_SLOTS:
     {
         QTest::addColumn<QString>("page");
         QTest::addColumn<QString>("project");
-        QTest::newRow("sample project") << "pages/a.html" << "ledctrl";
-        QTest::newRow("odd values") << "pages/b.html" << "odd";
-        QTest::newRow("no tool reports") << "pages/000007/device_usage_statistics.html" << "empty";
+        QTest::newRow("sample project") << "pages/a.html"
+                                        << "ledctrl";
+        QTest::newRow("odd values") << "pages/b.html"
+                                    << "odd";
+        QTest::newRow("no tool reports") << "pages/000007/device_usage_statistics.html"
+                                         << "empty";
     }
 
     void printsWhatTheBuilderWrote()
@@ -166,15 +171,18 @@ private Q_SLOTS:
         Values printed;
         for (const QJsonValue &v : QJsonDocument::fromJson(print.output.toUtf8())["values"].toArray()) {
             const QString name = v["name"].toString();
-            printed.append({v["tag"].toString() + (v["name"].isNull() ? QString() : ":" + name), v["value"].toString()});
+            printed.append(
+                {v["tag"].toString() + (v["name"].isNull() ? QString() : ":" + name), v["value"].toString()});
         }
         const Values expected = builderValues(m_work + "/" + project, "ledctrl");
         int found = 0;
         for (const auto &value : printed)
             if (found < expected.size() && value == expected.at(found))
                 ++found;
-        QVERIFY2(found == expected.size(), qPrintable(expected.value(found).first + "=" + expected.value(found).second));
-        QVERIFY(printed.contains({"dtag-property:TargetFamily", QStringLiteral("Xc6")}) == (project == "ledctrl"));
+        QVERIFY2(found == expected.size(),
+                 qPrintable(expected.value(found).first + "=" + expected.value(found).second));
+        QVERIFY(printed.contains({"dtag-property:TargetFamily", QStringLiteral("Xc6")})
+                == (project == "ledctrl"));
     }
 
     // Each page once, then already present; the same answers from both engines.
@@ -183,20 +191,23 @@ private Q_SLOTS:
         QVERIFY2(m_postgres.createDatabase("corvid"), qPrintable(m_postgres.error()));
         const QStringList urls{"sqlite:" + m_work + "/corvid.sqlite", m_postgres.url("corvid")};
         for (const QString &url : urls) {
-            QCOMPARE(ingest({"--db", url, "pages"}).output, QStringLiteral("ingested 3, already present 0, rejected 0\n"));
+            QCOMPARE(ingest({"--db", url, "pages"}).output,
+                     QStringLiteral("ingested 3, already present 0, rejected 0\n"));
             QCOMPARE(ingest({"--db", url, "--commit-every", "1", "pages", "pages/a.html"}).output,
                      QStringLiteral("ingested 0, already present 4, rejected 0\n"));
         }
         for (const QString &query : CrvB_Statistics::queries()) {
             QStringList answers;
             for (const QString &url : urls)
-                answers.append(runStaged("corvid-stats", {"--db", url, "--format", "json", query}, m_work).output);
+                answers.append(
+                    runStaged("corvid-stats", {"--db", url, "--format", "json", query}, m_work).output);
             QCOMPARE(answers.at(0), answers.at(1));
             QVERIFY2(QJsonDocument::fromJson(answers.at(0).toUtf8()).array().size() > 0, qPrintable(query));
         }
         const QString families = runStaged("corvid-stats", {"--db", urls.at(1), "families"}, m_work).output;
         QVERIFY2(families.contains(QRegularExpression("Xc7 +1\n")), qPrintable(families));
-        const QString html = runStaged("corvid-stats", {"--format", "html", "--db", urls.at(0), "tools"}, m_work).output;
+        const QString html =
+            runStaged("corvid-stats", {"--format", "html", "--db", urls.at(0), "tools"}, m_work).output;
         QVERIFY(html.contains("<svg") && html.contains("<td>synth</td>") && !html.contains("<script"));
     }
 
@@ -245,8 +256,12 @@ private Q_SLOTS:
         for (const char *page : {"a", "b"}) {
             if (*page == 'b')
                 sqlite(db, "DROP TRIGGER refuse");
-            const ToolRun sent = runStaged("vancurl", upload + QStringList{QStringLiteral("file_loc=@pages/%1.html").arg(page),
-                                                                           server.baseUrl() + "/upload"}, m_work);
+            const ToolRun sent =
+                runStaged("vancurl",
+                          upload
+                              + QStringList{QStringLiteral("file_loc=@pages/%1.html").arg(page),
+                                            server.baseUrl() + "/upload"},
+                          m_work);
             QVERIFY2(sent.exitCode == 0, qPrintable(sent.output));
         }
         const QString log = server.log();

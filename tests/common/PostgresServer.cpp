@@ -73,20 +73,22 @@ bool PostgresServer::start()
     }
     // Stops the server and removes the folder should this process end without
     // the destructor.
-    const QString stop = (asRoot() ? QStringLiteral("runuser -u postgres -- ") : QString()) + QLatin1String(BinDir)
-        + QLatin1String("/pg_ctl -D ") + m_dir + QLatin1String("/data -m immediate stop");
+    const QString stop = (asRoot() ? QStringLiteral("runuser -u postgres -- ") : QString())
+        + QLatin1String(BinDir) + QLatin1String("/pg_ctl -D ") + m_dir
+        + QLatin1String("/data -m immediate stop");
     const QString watchdog = QStringLiteral("exec </dev/null >/dev/null 2>&1; "
                                             "while kill -0 %1 2>/dev/null; do sleep 1; done; %2; rm -rf %3")
                                  .arg(QString::number(QCoreApplication::applicationPid()), stop, m_dir);
     QProcess::startDetached(QStringLiteral("sh"), {"-c", watchdog});
-    if (!run(QStringLiteral("initdb"), {"-D", m_dir + "/data", "-A", "trust", "-U", "postgres", "--no-locale",
-                                        "-E", "UTF8", "--no-sync"}))
+    if (!run(QStringLiteral("initdb"),
+             {"-D", m_dir + "/data", "-A", "trust", "-U", "postgres", "--no-locale", "-E", "UTF8",
+              "--no-sync"}))
         return false;
     QFile config(m_dir + QLatin1String("/data/postgresql.conf"));
     if (!config.open(QIODevice::Append)
         || config.write("listen_addresses = ''\nunix_socket_directories = '" + dir
                         + "'\nfsync = off\nsynchronous_commit = off\nfull_page_writes = off\n")
-               < 0) {
+            < 0) {
         m_error = QStringLiteral("cannot configure the server");
         return false;
     }

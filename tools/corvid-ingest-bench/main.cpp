@@ -50,7 +50,8 @@ QByteArray variedPage(int i)
     static const char *const devices[] = {"xc6a25", "xc6a50", "xc7k70", "ya1s15", "yb2t40", "zk9m100"};
     static const char *const packages[] = {"csg324", "fgg484", "ftg256", "cpg236"};
     static const char *const speeds[] = {"-1", "-2", "-3"};
-    static const char *const products[] = {"Orb Design Suite:14.5", "Orb Design Suite:14.6", "Orb Design Suite:14.7"};
+    static const char *const products[] = {"Orb Design Suite:14.5", "Orb Design Suite:14.6",
+                                           "Orb Design Suite:14.7"};
     static const char *const platforms[] = {"LIN64", "NT64", "LIN"};
     QByteArray page(samplePage);
     auto set = [&page](const char *from, const QByteArray &to) { page.replace(from, to); };
@@ -63,7 +64,8 @@ QByteArray variedPage(int i)
     set("\"TargetSpeed\">-2<", QByteArray("\"TargetSpeed\">") + speeds[i % 3] + "<");
     set("Orb Design Suite:14.7", products[i % 3]);
     set(">LIN64<", QByteArray(">") + platforms[i % 3] + "<");
-    set("<dtag-run-count>3</dtag-run-count>", "<dtag-run-count>" + QByteArray::number(i % 9 + 1) + "</dtag-run-count>");
+    set("<dtag-run-count>3</dtag-run-count>",
+        "<dtag-run-count>" + QByteArray::number(i % 9 + 1) + "</dtag-run-count>");
     set("Tue Mar 17 14:05:09 2026",
         QDateTime(QDate(2026, 1, 1), QTime(0, 0)).addSecs(i).toString(Qt::TextDate).toUtf8());
     return page;
@@ -83,7 +85,7 @@ bool writePages(const QString &dir, int first, int count, qint64 &bytes)
             || fields.write("received=2026-03-" + QByteArray::number(i % 28 + 1).rightJustified(2, '0')
                             + "T12:00:00Z\ndomain=example.org\nregid=REG-" + QByteArray::number(i % 400)
                             + "\nstored_as=device_usage_statistics.html\n")
-                   < 0)
+                < 0)
             return false;
     }
     return true;
@@ -115,8 +117,9 @@ int main(int argc, char **argv)
         else if (args.at(i) == QLatin1String("--db"))
             url = args.at(i + 1);
         else
-            return fail(QStringLiteral("usage: corvid-ingest-bench [--pages N] [--db URL] [--commit-every N] | --generate DIR "
-                                       "[--pages N] [--first K]"));
+            return fail(QStringLiteral(
+                "usage: corvid-ingest-bench [--pages N] [--db URL] [--commit-every N] | --generate DIR "
+                "[--pages N] [--first K]"));
     }
     if (pages < 1 || first < 1 || commitEvery < 1 || args.size() % 2 == 0)
         return fail(QStringLiteral("--pages, --first and --generate need values (see the source's head)"));
@@ -163,10 +166,11 @@ int main(int argc, char **argv)
     std::printf("pages: %d, %.1f KB each on average, %lld values each\n", pages, double(bytes) / pages / 1024,
                 values / inMemory.size());
     std::printf("reader alone: %.3f ms per page (%.0f pages/s)\n", readerMs, 1000 / readerMs);
-    std::printf("ingest into %s: %.0f ms wall, %.0f ms on this thread: %.0f pages/s wall, %.0f pages/s per core\n",
-                qUtf8Printable(store.url().engine == CrvB_DatabaseUrl::Engine::SQLite ? QStringLiteral("SQLite")
-                                                                                       : QStringLiteral("PostgreSQL")),
-                wallMs, cpuMs, pages * 1000 / wallMs, pages * 1000 / cpuMs);
+    std::printf(
+        "ingest into %s: %.0f ms wall, %.0f ms on this thread: %.0f pages/s wall, %.0f pages/s per core\n",
+        qUtf8Printable(store.url().engine == CrvB_DatabaseUrl::Engine::SQLite ? QStringLiteral("SQLite")
+                                                                              : QStringLiteral("PostgreSQL")),
+        wallMs, cpuMs, pages * 1000 / wallMs, pages * 1000 / cpuMs);
     std::printf("%s\n", qUtf8Printable(ingest.summary()));
     QFile load(QStringLiteral("/proc/loadavg"));
     if (load.open(QIODevice::ReadOnly))

@@ -58,7 +58,8 @@ int printPage(const QString &path)
     if (!QFileInfo(path).isFile() || !file.open(QIODevice::ReadOnly))
         return fail(QStringLiteral("cannot read %1 (not a regular file?)").arg(path));
     if (file.size() > CrvB_PageReader::MaxPageBytes)
-        return fail(QStringLiteral("rejected %1: larger than %2 bytes").arg(path, QString::number(CrvB_PageReader::MaxPageBytes)));
+        return fail(QStringLiteral("rejected %1: larger than %2 bytes")
+                        .arg(path, QString::number(CrvB_PageReader::MaxPageBytes)));
     const CrvB_PageReader::Result result = CrvB_PageReader::read(file.readAll());
     if (!result.ok())
         return fail(QStringLiteral("rejected %1: %2").arg(path, result.rejection));
