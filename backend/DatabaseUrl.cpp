@@ -1,5 +1,6 @@
 #include "DatabaseUrl.h"
 
+#include <QRegularExpression>
 #include <QUrl>
 #include <QUrlQuery>
 
@@ -21,12 +22,20 @@ bool portOf(const QString &text, int &port)
 
 } // namespace
 
+QString CrvB_DatabaseUrl::redacted(const QString &url)
+{
+    static const QRegularExpression userInfo(QStringLiteral("^(postgres(?:ql)?://[^:@/?]*:)[^@/?]*@"));
+    static const QRegularExpression parameter(QStringLiteral("([?&]password=)[^&]*"));
+    QString text = url;
+    return text.replace(userInfo, QStringLiteral("\\1***@")).replace(parameter, QStringLiteral("\\1***"));
+}
+
 bool CrvB_DatabaseUrl::parse(const QString &url, QString *error)
 {
     *this = CrvB_DatabaseUrl();
     auto fail = [&](const QString &why) {
         if (error)
-            *error = QStringLiteral("%1: %2").arg(url, why);
+            *error = QStringLiteral("%1: %2").arg(redacted(url), why);
         engine = Engine::None;
         return false;
     };

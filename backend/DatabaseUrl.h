@@ -19,6 +19,8 @@ public:
 
     // False with `error` when `url` is not one of the forms above.
     bool parse(const QString &url, QString *error);
+    // `url` with any password in it replaced by "***", for messages.
+    static QString redacted(const QString &url);
 
     Engine engine = Engine::None;
     QString database; // the SQLite file, or the PostgreSQL database name

@@ -172,11 +172,7 @@ void CrvB_Ingest::ingestPage(const QString &pagePath, const CrvB_Store::Arrival 
     const CrvB_PageReader::Result read = CrvB_PageReader::read(page);
     CrvB_ReportRecord record;
     QString reason = read.rejection;
-    if (read.ok() && !CrvB_ReportRecord::fromValues(read.values, record, &reason)) {
-        if (reason.isEmpty())
-            reason = QStringLiteral("values out of place");
-    }
-    if (!reason.isEmpty()) {
+    if (!read.ok() || !CrvB_ReportRecord::fromValues(read.values, record, &reason)) {
         reject(pagePath, sha256, reason);
         return;
     }
@@ -225,8 +221,10 @@ void CrvB_Ingest::reject(const QString &pagePath, const QByteArray &sha256, cons
     if (QFileInfo(copy).canonicalFilePath() == QFileInfo(pagePath).canonicalFilePath())
         return;
     QFile::remove(copy);
+    // A page over the size limit is not copied: it could be of any size.
+    const bool keep = QFileInfo(pagePath).size() <= CrvB_PageReader::MaxPageBytes;
     QFile reasonFile(copy + QLatin1String(".reason"));
-    if (!QFile::copy(pagePath, copy) || !reasonFile.open(QIODevice::WriteOnly | QIODevice::Truncate)
+    if ((keep && !QFile::copy(pagePath, copy)) || !reasonFile.open(QIODevice::WriteOnly | QIODevice::Truncate)
         || reasonFile.write(pagePath.toUtf8() + ": " + reason.toUtf8() + '\n') < 0)
         m_say(QStringLiteral("cannot copy %1 to %2").arg(pagePath, m_rejectedFolder));
 }

@@ -45,7 +45,9 @@ QVariant textOrNull(const QString &text)
 }
 
 // The rows of one table for one page, written with as few statements as
-// possible: inserts of 32, 16, ... 1 rows at a time, each prepared once.
+// possible: inserts of 32 rows at a time as they come, then of 16, 8, ... 1
+// for the rest, each statement prepared once. So a large page is never held
+// a second time over as bound values.
 class RowWriter
 {
 public:
@@ -57,38 +59,54 @@ public:
     {
     }
 
+    // Starts the rows of the report `reportId`.
+    void begin(qlonglong reportId)
+    {
+        m_reportId = reportId;
+        m_values.clear();
+        m_error.clear();
+        m_failed = false;
+    }
+
     void add(std::initializer_list<QVariant> values)
     {
-        m_values.append(QVariant()); // the report's key, known when written
+        if (m_failed)
+            return;
+        m_values.append(QVariant(m_reportId));
         m_values.append(values);
+        if (m_values.size() == MaxRows * m_width)
+            write();
     }
 
-    bool write(qlonglong reportId, QString *error)
+    // Writes the rows not written yet; false with `error` when any failed.
+    bool finish(QString *error)
     {
-        const int rows = int(m_values.size()) / m_width;
-        int done = 0;
-        for (int chunk = MaxRows; chunk >= 1; chunk /= 2) {
-            for (; rows - done >= chunk; done += chunk) {
-                QSqlQuery &query = statement(chunk);
-                for (int i = 0; i < chunk * m_width; ++i)
-                    query.bindValue(placeholder(i), i % m_width == 0
-                                                        ? QVariant(reportId)
-                                                        : bindable(m_values.at(done * m_width + i)));
-                if (!query.exec()) {
-                    *error = errorText(query.lastError());
-                    clear();
-                    return false;
-                }
-            }
-        }
-        clear();
-        return true;
+        write();
+        if (m_failed)
+            *error = m_error;
+        return !m_failed;
     }
-
-    void clear() { m_values.clear(); }
 
 private:
     static const int MaxRows = 32;
+
+    void write()
+    {
+        const int rows = int(m_values.size()) / m_width;
+        int done = 0;
+        for (int chunk = MaxRows; chunk >= 1 && !m_failed; chunk /= 2) {
+            for (; rows - done >= chunk && !m_failed; done += chunk) {
+                QSqlQuery &query = statement(chunk);
+                for (int i = 0; i < chunk * m_width; ++i)
+                    query.bindValue(placeholder(i), bindable(m_values.at(done * m_width + i)));
+                if (!query.exec()) {
+                    m_error = errorText(query.lastError());
+                    m_failed = true;
+                }
+            }
+        }
+        m_values.clear();
+    }
 
     // A text column is never bound NULL by accident: QtSql binds a null
     // QString as NULL, and a page's empty values are texts.
@@ -116,7 +134,10 @@ private:
     QSqlDatabase m_db;
     QString m_head;
     int m_width;
+    qlonglong m_reportId = -1;
     QVariantList m_values;
+    QString m_error;
+    bool m_failed = false;
     std::map<int, std::unique_ptr<QSqlQuery>> m_statements;
 };
 
@@ -229,7 +250,8 @@ bool CrvB_Store::open(const QString &url, bool readOnly, QString *error)
         db.setConnectOptions(m_url.options);
     }
     if (!db.open()) {
-        *error = QStringLiteral("cannot open the database %1: %2").arg(url, errorText(db.lastError()));
+        *error = QStringLiteral("cannot open the database %1: %2")
+                     .arg(CrvB_DatabaseUrl::redacted(url), errorText(db.lastError()));
         return false;
     }
     if (readOnly)
@@ -332,33 +354,9 @@ bool CrvB_Store::contains(const QByteArray &sha256, QString *error)
     return found;
 }
 
-CrvB_Store::Outcome CrvB_Store::store(const QByteArray &sha256, qint64 pageBytes,
-                                      const CrvB_ReportRecord &record, const Arrival &arrival, QString *error)
+void CrvB_Store::addRows(const CrvB_ReportRecord &record)
 {
     Statements &s = *m_statements;
-    QSqlDatabase db = database();
-    if (m_batchLost) {
-        *error = QStringLiteral("the batch was rolled back");
-        return Outcome::Failed;
-    }
-    if (m_inBatch ? !exec("SAVEPOINT page") : !db.transaction()) {
-        *error = errorText(db.lastError());
-        return Outcome::Failed;
-    }
-
-    QVariantList reportValues{QString::fromLatin1(sha256), pageBytes};
-    for (const QString &column : CrvB_ReportRecord::propertyColumns().values())
-        reportValues.append(textOrNull(record.properties.value(column)));
-    reportValues += {textOrNull(arrival.receivedAt), textOrNull(arrival.domain), textOrNull(arrival.regid),
-                     textOrNull(arrival.source), QDateTime::currentDateTimeUtc().toString(Qt::ISODate)};
-    for (int i = 0; i < reportValues.size(); ++i)
-        s.report.bindValue(placeholder(i), reportValues.at(i));
-    bool ok = s.report.exec() && s.report.next();
-    const qlonglong id = ok ? s.report.value(0).toLongLong() : -1;
-    if (!ok)
-        *error = errorText(s.report.lastError());
-    s.report.finish();
-
     for (int i = 0; i < record.groups.size(); ++i)
         s.group.add({i, record.groups.at(i).section, record.groups.at(i).name});
     for (int i = 0; i < record.items.size(); ++i) {
@@ -396,11 +394,41 @@ CrvB_Store::Outcome CrvB_Store::store(const QByteArray &sha256, qint64 pageBytes
         const auto &o = record.others.at(i);
         s.other.add({i, o.tag, o.name, o.path, o.value});
     }
-    for (RowWriter *writer : s.writers()) {
-        if (ok)
-            ok = writer->write(id, error);
-        else
-            writer->clear();
+}
+
+CrvB_Store::Outcome CrvB_Store::store(const QByteArray &sha256, qint64 pageBytes,
+                                      const CrvB_ReportRecord &record, const Arrival &arrival, QString *error)
+{
+    Statements &s = *m_statements;
+    QSqlDatabase db = database();
+    if (m_batchLost) {
+        *error = QStringLiteral("the batch was rolled back");
+        return Outcome::Failed;
+    }
+    if (m_inBatch ? !exec("SAVEPOINT page") : !db.transaction()) {
+        *error = errorText(db.lastError());
+        return Outcome::Failed;
+    }
+
+    QVariantList reportValues{QString::fromLatin1(sha256), pageBytes};
+    for (const QString &column : CrvB_ReportRecord::propertyColumns().values())
+        reportValues.append(textOrNull(record.properties.value(column)));
+    reportValues += {textOrNull(arrival.receivedAt), textOrNull(arrival.domain), textOrNull(arrival.regid),
+                     textOrNull(arrival.source), QDateTime::currentDateTimeUtc().toString(Qt::ISODate)};
+    for (int i = 0; i < reportValues.size(); ++i)
+        s.report.bindValue(placeholder(i), reportValues.at(i));
+    bool ok = s.report.exec() && s.report.next();
+    const qlonglong id = ok ? s.report.value(0).toLongLong() : -1;
+    if (!ok)
+        *error = errorText(s.report.lastError());
+    s.report.finish();
+
+    if (ok) {
+        for (RowWriter *writer : s.writers())
+            writer->begin(id);
+        addRows(record);
+        for (RowWriter *writer : s.writers())
+            ok = ok && writer->finish(error);
     }
 
     if (m_inBatch) {

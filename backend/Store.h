@@ -63,6 +63,8 @@ public:
 private:
     bool createSchema(QString *error);
     bool exec(const char *sql);
+    // Hands the record's rows to the row writers, table by table.
+    void addRows(const CrvB_ReportRecord &record);
     class Statements;
 
     QString m_connection;

@@ -8,6 +8,7 @@
 
 #include <QCoreApplication>
 #include <QFile>
+#include <QFileInfo>
 
 #include <cstdio>
 
@@ -54,8 +55,8 @@ int fail(const QString &message)
 int printPage(const QString &path)
 {
     QFile file(path);
-    if (!file.open(QIODevice::ReadOnly))
-        return fail(QStringLiteral("cannot read %1").arg(path));
+    if (!QFileInfo(path).isFile() || !file.open(QIODevice::ReadOnly))
+        return fail(QStringLiteral("cannot read %1 (not a regular file?)").arg(path));
     if (file.size() > CrvB_PageReader::MaxPageBytes)
         return fail(QStringLiteral("rejected %1: larger than %2 bytes")
                         .arg(path, QString::number(CrvB_PageReader::MaxPageBytes)));
