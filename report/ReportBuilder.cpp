@@ -24,7 +24,18 @@
 
 #include <QThread>
 
-#if defined(__GLIBC__)
+// Under AddressSanitizer the heap is the sanitizer's: glibc's malloc_trim
+// would walk arenas that were never set up.
+#if defined(__has_feature)
+#if __has_feature(address_sanitizer)
+#define CORVID_ASAN_HEAP 1
+#endif
+#endif
+#if defined(__SANITIZE_ADDRESS__)
+#define CORVID_ASAN_HEAP 1
+#endif
+#if defined(__GLIBC__) && !defined(CORVID_ASAN_HEAP)
+#define CORVID_TRIM_HEAP 1
 #include <malloc.h>
 #endif
 
@@ -83,7 +94,7 @@ private:
 // much of it in the heaps of its threads, to no use until the next build.
 void releaseFreedMemory()
 {
-#if defined(__GLIBC__)
+#if defined(CORVID_TRIM_HEAP)
     malloc_trim(0);
 #endif
 }

@@ -11,6 +11,7 @@
 #include "ui/SendToClipDlgImp.h"
 
 #include <QDir>
+#include <QPointer>
 #include <QSemaphore>
 #include <QtTest>
 
@@ -30,7 +31,9 @@ public:
     bool release(CrvC_DataCollectionDialog *review)
     {
         m_gate.release();
-        return QTest::qWaitFor([review] { return review->reportReady(); }, 20000);
+        // A review that sends once its page is ready goes away right after.
+        const QPointer<CrvC_DataCollectionDialog> guard(review);
+        return QTest::qWaitFor([&guard] { return !guard || guard->reportReady(); }, 20000);
     }
     // Lets every build go and waits for their threads (also a build whose window is gone).
     void finish()
